@@ -1,0 +1,48 @@
+/*
+ * db.h - the session's device database and BSDL import.
+ *
+ * IDCODE texts are '0'/'1' characters, most significant bit first; a
+ * shorter text counts as having leading zeros.
+ */
+#ifndef JEXJTAG_DB_H
+#define JEXJTAG_DB_H
+
+#include "types.h"
+
+JEXJTAG_BEGIN_DECLS
+
+/* Adds an IDCODE list held in buf (bufsize bytes) to the session's database;
+ * its entries win over the installation's for the same pattern.  filename
+ * only labels messages.  A bad line fails; the lines before it stay. */
+JEXJTAG_API uint32_t JexJtag_db_addDeviceData(unsigned handle, const char* filename, const char* buf,
+                                              unsigned bufsize);
+
+/* Looks an IDCODE up.  A code nobody knows succeeds with an empty name, IR
+ * length 0 and an empty BYPASS text.  Texts are cut to their buffer size - 1
+ * and NUL-terminated.  On failure the name buffer is zeroed, *irlen is 0 and
+ * the BYPASS buffer is filled with 0xFF bytes.  irlen must not be null. */
+JEXJTAG_API uint32_t JexJtag_db_lookupDevice(unsigned handle, const char* idcode, char* deviceName,
+                                             unsigned devicebuf_size, unsigned* irlen, char* cmd_bypass,
+                                             unsigned bypassbuf_size);
+JEXJTAG_API uint32_t JexJtag_db_getDeviceNameForIdcode(unsigned handle, const char* idcode,
+                                                       char* deviceName, unsigned devicebuf_size);
+JEXJTAG_API uint32_t JexJtag_db_getIRLengthForIdcode(unsigned handle, const char* idcode, unsigned* irlen);
+JEXJTAG_API uint32_t JexJtag_db_getBypassForIdcode(unsigned handle, const char* idcode, char* cmd_bypass,
+                                                   unsigned bypassbuf_size);
+
+/* Reads a BSDL text held in memory: entity name, instruction length, IDCODE
+ * register text (empty when the device has none) and the first BYPASS
+ * opcode.  Output buffers are zeroed first; texts are cut to size - 1. */
+JEXJTAG_API uint32_t JexJtag_db_parseBSDL(unsigned handle, const char* filename, const char* buf,
+                                          unsigned bufLen, char* deviceName, unsigned deviceNameLen,
+                                          unsigned* irlength, char* idcode, unsigned idcodeLen,
+                                          char* cmd_bypass, unsigned bypassbufLen);
+/* The same for a BSDL file; a file that cannot be opened fails without
+ * touching the outputs. */
+JEXJTAG_API uint32_t JexJtag_db_parseBSDLFile(unsigned handle, const char* filename, char* deviceName,
+                                              unsigned deviceNameLen, unsigned* irlength, char* idcode,
+                                              unsigned idcodeLen, char* cmd_bypass, unsigned bypassbufLen);
+
+JEXJTAG_END_DECLS
+
+#endif /* JEXJTAG_DB_H */

@@ -1,0 +1,3 @@
+#include "jexjtag/rt/Jex_Exception.hpp"
+
+Jex_Exception::~Jex_Exception() = default;
