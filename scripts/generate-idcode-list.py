@@ -857,6 +857,10 @@ def read_openfpgaloader(program, listing):
         return [], [], None
     cols = [header.index(h) for h in ("manufacturer", "family", "model")]
     names, families = [], []
+    listed = [int(l[:10], 16) for l in lines if re.match(r"0x[0-9a-fA-F]{8}\s", l)]
+    versions = defaultdict(set)
+    for v in listed:
+        versions[v & 0x0FFFFFFF].add(v >> 28)
     for line in lines:
         if not re.match(r"0x[0-9a-fA-F]{8}\s", line):
             continue
@@ -864,9 +868,14 @@ def read_openfpgaloader(program, listing):
         vendor = line[cols[0]:cols[1]].strip().lower()
         family = line[cols[1]:cols[2]].strip()
         model = line[cols[2]:].strip()
-        names.append(NameClaim(value, False, ofl_name(vendor, family, model), NAME_OFL,
-                               ofl_family(vendor, family), origin))
-        families.append((value, vendor, family.lower()))
+        # The list keeps most parts with version 0 and openFPGALoader
+        # compares those without the version nibble: they name the part.
+        # Where the list itself has several versions of one part (the ECP5
+        # variants) each names its version.
+        whole_part = value >> 28 == 0 and versions[value & 0x0FFFFFFF] == {0}
+        names.append(NameClaim(value, whole_part, ofl_name(vendor, family, model),
+                               NAME_OFL, ofl_family(vendor, family), origin))
+        families.append((value, whole_part, vendor, family.lower()))
     return names, families, origin
 
 
@@ -879,27 +888,32 @@ def ofl_family_claims(families, claims, origin, log):
     Cyclone V handbook: 10 bits); multi-die parts differ, so a family with
     no known member, or members that disagree, gets nothing."""
     ir_by_low = defaultdict(set)
+    all_versions, exact = set(), set()
     for c in claims:
         if valid_idcode(c.value):
             ir_by_low[c.value & 0x0FFFFFFF].add(c.irlen)
+            if c.all_versions:
+                all_versions.add(c.value & 0x0FFFFFFF)
+            else:
+                exact.add(c.value)
     members = defaultdict(list)
-    for value, vendor, family in families:
-        members[(vendor, family)].append(value)
+    for value, whole_part, vendor, family in families:
+        members[(vendor, family)].append((value, whole_part))
     out = []
     for key in sorted(members):
         values = members[key]
         known = set()
-        for v in values:
+        for v, _ in values:
             known |= ir_by_low.get(v & 0x0FFFFFFF, set())
-        unknown = [v for v in values if v & 0x0FFFFFFF not in ir_by_low]
+        unknown = [(v, w) for v, w in values
+                   if v & 0x0FFFFFFF not in all_versions and v not in exact]
         if not unknown or len(known) != 1:
             continue
         irlen = next(iter(known))
-        for v in unknown:
-            out.append(Claim(v, False, irlen, SOURCE_OFL, origin + " (IR of its family)"))
-        log.append("openfpgaloader %s %s: IR %d from %d known member(s) for %s" % (
-            key[0], key[1], irlen, len(values) - len(unknown),
-            " ".join("0x%08X" % v for v in unknown)))
+        for v, w in unknown:
+            out.append(Claim(v, w, irlen, SOURCE_OFL, origin + " (IR of its family)"))
+        log.append("openfpgaloader %s %s: IR %d from its other members for %s" % (
+            key[0], key[1], irlen, " ".join("0x%08X" % v for v, _ in unknown)))
     return out
 
 
@@ -1020,7 +1034,7 @@ def valid_idcode(value):
         return False
     if (value >> 1) & 0x7F == 0x7F:
         return False
-    if value & 0x0FFFFFFF == 1:
+    if (value >> 1) & 0x7FF == 0:
         return False
     return True
 
@@ -1142,6 +1156,13 @@ def resolve(claims, name_claims, ambiguous, log):
 
     entries = []
     for low, group in groups.items():
+        # A TAP that OpenOCD declares disabled sits behind a TAP router and
+        # is not what a chain scan at reset reads; several TI configurations
+        # give such a DAP the router's IDCODE.  Where the same part is also
+        # declared as a visible TAP, the visible declarations decide.
+        visible = [c for c in group if not c.hidden]
+        if visible:
+            group = visible
         exact = sorted({c.value for c in group if not c.all_versions})
         any_version = [c for c in group if c.all_versions]
         # Names per known version: exact-version name claims, or the
