@@ -5,60 +5,83 @@ The list is compiled from public device data that Debian packages carry:
 
   openocd         TCL configuration files under /usr/share/openocd/scripts:
                   every `jtag newtap ... -irlen N -expected-id ID` (and
-                  `swj_newdap`, which is the same thing on a JTAG transport)
-                  gives an IDCODE with its instruction-register length.
+                  `swj_newdap`, the same thing on a JTAG transport) gives an
+                  IDCODE with its instruction-register length.  The files
+                  are read by a small abstract TCL interpreter (set, if,
+                  switch, foreach, proc, source) that follows the JTAG
+                  branches, so SWD-only IDs set for other transports are not
+                  taken.
   urjtag          the part database under /usr/share/urjtag: MANUFACTURERS
                   (bits 11..1), <maker>/PARTS (bits 27..12),
                   <maker>/<part>/STEPPINGS (bits 31..28) and the part files,
                   whose "instruction length N" line gives the IR length.
   xc3sprog        its built-in device list, written out by `xc3sprog -D`
                   (IDCODE, IR length, name).
+  avrdude         /etc/avrdude.conf: 8-bit AVRs with a JTAG interface and
+                  their signatures (see read_avrdude); `avarice
+                  --known-devices` confirms the part numbers it knows.
   openfpgaloader  `openFPGALoader --list-fpga` (IDCODE, vendor, family,
-                  model); it gives no IR length and is used for names and
-                  device categories only.
+                  model): names and device categories; it gives no IR
+                  length (see ofl_family_claims for the parts only it has).
 
-Run with no arguments after `apt-get install openocd urjtag xc3sprog
-openfpgaloader` to rewrite data/idcode.lst beside this script; see --help for
-other paths.  `--check FILE` only validates an existing list.
+Run with no arguments after
+  apt-get install openocd urjtag xc3sprog avrdude avarice openfpgaloader
+to rewrite data/idcode.lst beside this script (set SOURCE_DATE_EPOCH to pin
+the date line); see --help for other paths.  `--check FILE` only validates
+a list (grammar exactly as the library reads it, sorted, sub type = bits
+11..1, at least 600 patterns, known devices); `--self-test` checks the
+checker.
 
-How conflicts are resolved (see resolve() for the code):
+How conflicts are resolved (resolve() and pick_irlen()):
 
 * Version bits.  Claims are grouped by IDCODE bits 27..0 (part number and
-  manufacturer).  When every source agrees on the IR length for the part and
-  no source gives a different device name for a different version, the part
-  gets one entry with XXXX in bits 31..28: a new silicon revision does not
-  change the instruction register, and the exact version in a source is only
-  the revision its author had on the bench.  When versions differ in name
-  (Lattice ECP5 puts the device variant into the version nibble: 0x21111043
-  is LFE5U-12F, 0x41111043 LFE5U-25F) or in IR length, each known version
-  gets an exact entry; a source that explicitly matches every revision
-  (OpenOCD -ignore-version, xc3sprog) then adds an XXXX entry as fallback,
-  which sorts after the exact ones and so is found last.
+  manufacturer).  When the sources agree on the IR length for the part and
+  no device-naming source (UrJTAG, OpenOCD's ID comments, openFPGALoader,
+  the corrections below) gives a different name for a different version,
+  the part gets one entry with XXXX in bits 31..28: a new silicon revision
+  does not change the instruction register, and an exact version in a
+  source is the revision its author had at hand.  When versions differ in
+  name (Lattice puts device variants into the version nibble: 0x21111043 is
+  LFE5U-12F, 0x41111043 LFE5U-25F) or in IR length, each known version gets
+  an exact entry; a claim that covers every revision (OpenOCD
+  -ignore-version, xc3sprog, a version-0 openFPGALoader part) then adds an
+  XXXX entry as fallback.  An exact entry sorts before the XXXX entry of
+  the same part, so a lookup finds it first.
 
-* IR length.  When sources give different IR lengths for the same pattern,
-  the value with the most independent sources wins (a source counts once
-  per pattern however many of its files repeat it); on a tie the source
-  order OpenOCD, UrJTAG, xc3sprog decides.  OpenOCD goes first because it
-  checks the IR length against the captured IR of every TAP on every scan,
-  so a wrong value shows up at once in daily use; UrJTAG's part files are
-  next because they are written from the vendors' BSDL files.  Every
-  conflict is printed when the script runs.
+* IR length.  When claims for one pattern differ, a TAP that OpenOCD
+  declares -disable (hidden behind a TAP router; several TI files give such
+  a DAP the router's IDCODE) yields to a visible declaration of the same
+  part.  Then the value with the most independent sources wins (a source
+  counts once however many of its files repeat it); on a tie the source
+  order OpenOCD, UrJTAG, xc3sprog, avrdude, openFPGALoader decides, then the
+  number of files that declare it.  OpenOCD goes first because it checks
+  the IR length against the captured IR of every TAP on every scan, so a
+  wrong value shows up at once in daily use; UrJTAG's part files come next
+  because they are written from the vendors' BSDL files.  Every conflict is
+  printed when the script runs (-v prints every decision).
 
 * Names.  Per version, the first source in this order that names the device
-  wins: corrections in NAME_FIXES below, UrJTAG PARTS, an OpenOCD comment
-  of the form "# 0x41111043 - LFE5U_25F", xc3sprog, openFPGALoader, then a
-  name made from the OpenOCD chip and TAP names (STM32F1X.BS).  IDCODEs of
-  ARM-designed debug ports are shared by hundreds of chips and get the
-  names in ARM_PARTS.  Names are made valid for the list grammar: white
-  space and '#' become '_', and a name shorter than 2 characters is padded
-  from the manufacturer.
+  wins: NAME_FIXES below, UrJTAG PARTS, an OpenOCD comment of the form
+  "# 0x41111043 - LFE5U_25F", avrdude, xc3sprog, openFPGALoader, then a name
+  made from the OpenOCD chip and TAP names (STM32F1X.BS; with the part
+  number appended when one TAP declaration accepts several parts).  The
+  ARM JTAG-DP (part 0xBA00 of ARM, 0x23B) is shared by hundreds of chips and
+  is called ARM_JTAG-DP.  Names are made valid for the list grammar: only
+  printable ASCII without '#' (Cyrillic is transliterated), at least 2
+  characters.
+
+* UrJTAG directories that serve several JEDEC codes (lattice, analog,
+  broadcom, marvell) do not say which code a part carries: a part is kept
+  under the code another source knows for the same part or, failing that,
+  for a part of the same series (leading letters: BF537 confirms BF533);
+  otherwise it is left out.
 
 * Left out: IDCODEs with bit 0 clear (not an IEEE 1149.1 IDCODE), with the
-  reserved manufacturer code 0x7F, or with part number and manufacturer both
-  zero (0x?0000001 is what several unrelated non-compliant chips report),
-  IR lengths outside 2..64, placeholder entries (xc3sprog's IR length 99
-  "Unknown" lines), SWD-only debug port IDs that OpenOCD sets for SWD
-  transports, and the entries in EXCLUDE below.
+  reserved manufacturer code 0x7F or no manufacturer code at all (0x?0000001
+  and the like are what non-compliant chips report), IR lengths outside
+  2..64, placeholder entries (xc3sprog's IR length 99 "Unknown" lines), ARM
+  SW-DP DPIDR values that OpenOCD passes for SWD-only chips (is_arm_dpidr),
+  AVRs where avarice contradicts the signature, and the entries in EXCLUDE.
 
 The output is sorted by pattern text in the byte order the library sorts in
 (0 < 1 < X), so regenerating from the same sources gives the same file
@@ -820,7 +843,7 @@ def read_xc3sprog(program, listing):
             if os.path.isfile(p):
                 with open(p, encoding="latin-1") as f:
                     text = f.read()
-        origin = "`%s -D` devlist.txt" % os.path.basename(program)
+        origin = "%s -D" % os.path.basename(program)
     if text is None:
         return [], [], None
     claims, names = [], []
@@ -848,7 +871,7 @@ def read_openfpgaloader(program, listing):
         r = subprocess.run([program, "--list-fpga"], stdout=subprocess.PIPE,
                            stderr=subprocess.DEVNULL, check=False)
         text = r.stdout.decode("latin-1")
-        origin = "`%s --list-fpga`" % os.path.basename(program)
+        origin = "%s --list-fpga" % os.path.basename(program)
     if not text:
         return [], [], None
     lines = text.splitlines()
@@ -919,6 +942,8 @@ def ofl_family_claims(families, claims, origin, log):
 
 def ofl_name(vendor, family, model):
     name = model
+    if vendor == "lattice":
+        name = name.replace("LCMX03", "LCMXO3")   # digit 0 for letter O in the list
     if vendor == "xilinx":
         name = model.upper()
         # "artix a7 35t" / "xc7a35": the family column has the T suffix.
@@ -1067,15 +1092,17 @@ def pick_irlen(claims, log, what):
     if visible:
         claims = visible
     by_ir = defaultdict(set)
+    files = defaultdict(set)
     for c in claims:
         by_ir[c.irlen].add(c.source)
+        files[c.irlen].add(c.origin)
     if len(by_ir) == 1:
         return next(iter(by_ir))
 
     def key(ir):
         srcs = by_ir[ir]
         best = min(IR_SOURCE_ORDER.index(s) for s in srcs)
-        return (-len(srcs), best, ir)
+        return (-len(srcs), best, -len(files[ir]), ir)
     winner = min(by_ir, key=key)
     log.append("IR length conflict for %s: %s -> %d" % (
         what, ", ".join("%d from %s" % (ir, "+".join(sorted(by_ir[ir])))
@@ -1309,11 +1336,16 @@ def header(args, counts, files):
         "#   openocd %s: TAP declarations in %s" % (package_version("openocd"), args.openocd),
         "#   urjtag %s: part database in %s" % (package_version("urjtag"), args.urjtag),
         "#   xc3sprog %s: built-in device list (xc3sprog -D)" % package_version("xc3sprog"),
-        "#   openfpgaloader %s: openFPGALoader --list-fpga (names only)"
+        "#   avrdude %s: 8-bit AVRs with JTAG in %s" % (package_version("avrdude"),
+                                                      args.avrdude_conf),
+        "#   avarice %s: avarice --known-devices (confirms AVR part numbers)"
+        % package_version("avarice"),
+        "#   openfpgaloader %s: openFPGALoader --list-fpga (names; IR length of"
         % package_version("openfpgaloader"),
-        "# Entries: %d (openocd %d, urjtag %d, xc3sprog %d claims)." % (
-            counts["entries"], counts[SOURCE_OPENOCD], counts[SOURCE_URJTAG],
-            counts[SOURCE_XC3SPROG]),
+        "#     the family for parts the other sources do not have)",
+        "# See scripts/generate-idcode-list.py for how conflicts between sources",
+        "# are resolved.  Entries: %d; entries each source contributed to:" % counts["entries"],
+        "#   " + ", ".join("%s %d" % (src, counts[src]) for src in IR_SOURCE_ORDER),
         "# Files read that gave entries:",
     ]
     for label, fl in files:
@@ -1322,7 +1354,54 @@ def header(args, counts, files):
     return h
 
 
-LINE_RE = re.compile(r"^\s*([01Xx_]+)[\s,]+(\d+)[\s,]+(\d+)[\s,]+(\d+)[\s,]+([^\s#]+)")
+C_SPACE = " \t\n\v\f\r"
+
+
+def parse_list_line(line):
+    """Parse one line exactly as the library's IDCODE list reader does.
+    Returns None for a line without data, a tuple (pattern, irlen, family,
+    subtype, name) for an entry, or raises ValueError with the reader's
+    message."""
+    i, n = 0, len(line)
+    while i < n and line[i] in C_SPACE:
+        i += 1
+    pattern, comment = "", False
+    while i < n and line[i] not in C_SPACE and line[i] != ",":
+        ch = line[i]
+        if ch in "01Xx":
+            pattern += ch
+        elif ch == "#":
+            comment = True
+            break
+        elif ch != "_":
+            raise ValueError("invalid character in idcode.")
+        i += 1
+    fields = []
+    for what in ("register length", "family type", "sub type"):
+        if comment:
+            fields.append("")
+            continue
+        while i < n and (line[i] in C_SPACE or line[i] == ","):
+            i += 1
+        start = i
+        while i < n and line[i] not in C_SPACE and line[i] != ",":
+            if not line[i].isdigit() or not line[i].isascii():
+                raise ValueError("non-digit character in %s." % what)
+            i += 1
+        fields.append(line[start:i])
+    name = ""
+    if not comment:
+        while i < n and (line[i] in C_SPACE or line[i] == ","):
+            i += 1
+        start = i
+        while i < n and line[i] not in C_SPACE and line[i] != "#":
+            i += 1
+        name = line[start:i]
+    if not pattern and not fields[0] and not fields[1] and not name:
+        return None
+    if len(pattern) != 32 or not all(fields) or len(name) < 2:
+        raise ValueError("bad data.")
+    return pattern, int(fields[0]), int(fields[1]), int(fields[2]), name
 
 
 def check_file(path, min_entries=MIN_ENTRIES, spot_checks=True):
@@ -1337,34 +1416,31 @@ def check_file(path, min_entries=MIN_ENTRIES, spot_checks=True):
         problems.append("byte %d: not ASCII" % e.start)
         text = data.decode("latin-1")
     lines = text.split("\n")
-    for no, line in enumerate(lines):
-        s = line.strip()
-        if not s or s.startswith("#"):
+    if lines and lines[-1] == "":
+        lines.pop()
+    for no, line in enumerate(lines):   # numbered from 0, as the reader does
+        try:
+            entry = parse_list_line(line)
+        except ValueError as e:
+            problems.append("line:%d - %s" % (no, e))
             continue
-        m = LINE_RE.match(line)
-        if not m:
-            problems.append("line %d: does not parse: %r" % (no, line))
+        if entry is None:
             continue
-        pat = m.group(1).replace("_", "")
-        if len(pat) != 32:
-            problems.append("line %d: pattern has %d bits" % (no, len(pat)))
-            continue
+        pat, irlen, family, subtype, name = entry
         if pat[31] != "1":
-            problems.append("line %d: bit 0 is not 1" % no)
-        if len(m.group(5)) < 2:
-            problems.append("line %d: name shorter than 2 characters" % no)
-        if not IR_MIN <= int(m.group(2)) <= IR_MAX:
-            problems.append("line %d: IR length %s out of range" % (no, m.group(2)))
-        if int(m.group(3)) not in FAMILY_NAMES:
-            problems.append("line %d: family type %s undefined" % (no, m.group(3)))
-        mfr = int(pat[20:31], 2)
-        if int(m.group(4)) != mfr:
-            problems.append("line %d: sub type %s is not bits 11..1 (%d)" % (no, m.group(4), mfr))
-        if not re.fullmatch(r"(0|1|X)+", pat):
-            problems.append("line %d: pattern uses characters other than 0 1 X" % no)
+            problems.append("line:%d - bit 0 is not 1" % no)
+        if not IR_MIN <= irlen <= IR_MAX:
+            problems.append("line:%d - IR length %d out of range" % (no, irlen))
+        if family not in FAMILY_NAMES:
+            problems.append("line:%d - family type %d undefined" % (no, family))
+        if pat[20:31].count("X") == 0 and subtype != int(pat[20:31], 2):
+            problems.append("line:%d - sub type %d is not bits 11..1 (%d)"
+                            % (no, subtype, int(pat[20:31], 2)))
+        if "x" in pat:
+            problems.append("line:%d - lower-case x (sorts after X)" % no)
         if pat in patterns:
-            problems.append("line %d: pattern repeated from line %d" % (no, patterns[pat][0]))
-        patterns[pat] = (no, int(m.group(2)), m.group(5))
+            problems.append("line:%d - pattern repeated from line:%d" % (no, patterns[pat][0]))
+        patterns[pat] = (no, irlen, name)
     keys = [pattern_sort_key(p) for p in patterns]
     if keys != sorted(keys):
         problems.append("entries are not sorted")
@@ -1407,6 +1483,66 @@ SPOT_CHECKS = [
 ]
 
 
+def self_test():
+    """Check the checker: the line grammar on the reader's edge cases, and
+    check_file() on small lists.  Returns a list of failures."""
+    P = "0000_1010_0000_0000_0001_0000_1001_0011"
+    B = P.replace("_", "")
+    cases = [
+        (P + " 6 1 2 DEVA", (B, 6, 1, 2, "DEVA")),
+        ("XXXX" + P[4:].replace(" ", ",") + ",6,1,2,DEVA", ("XXXX" + B[4:], 6, 1, 2, "DEVA")),
+        (B[:31] + " 6 1 2 DEVA", "bad data."),
+        (B + "1 6 1 2 DEVA", "bad data."),
+        (B + " 6 1 2 D", "bad data."),
+        (B + " 6 1", "bad data."),
+        (B + " 6 1 DEVA", "non-digit character in sub type."),
+        (B + " 6 1 2 #note", "bad data."),
+        (B + " 6 1 2 DEVA#note", (B, 6, 1, 2, "DEVA")),
+        ("0001#", "bad data."),
+        ("# comment", None), ("", None), ("    ", None), ("____", None), (",,,", None),
+        (B[:-1] + "Z 6 1 2 DEVA", "invalid character in idcode."),
+        (B + " 6a 1 2 DEVA", "non-digit character in register length."),
+        (B + " 6 1 2 DEV,REV2 more words", (B, 6, 1, 2, "DEV,REV2")),
+        (B + " 6 1 2 DEVA\r", (B, 6, 1, 2, "DEVA")),
+        (B.replace("1", "x", 1) + " 6 1 2 DEVA", (B.replace("1", "x", 1), 6, 1, 2, "DEVA")),
+    ]
+    failures = []
+    for line, want in cases:
+        try:
+            got = parse_list_line(line)
+        except ValueError as e:
+            got = str(e)
+        if got != want:
+            failures.append("parse %r: got %r, expected %r" % (line, got, want))
+
+    def check_text(text):
+        with tempfile.NamedTemporaryFile("w", suffix=".lst", delete=False) as f:
+            f.write(text)
+        try:
+            return check_file(f.name, min_entries=2, spot_checks=False)
+        finally:
+            os.unlink(f.name)
+    a = "0000_0000_0000_0000_0000_0000_0000_0011 4 3 1 AA\n"
+    b = "XXXX_0000_0000_0000_0000_0000_0000_0011 4 3 1 BB\n"
+    for text, expect in [
+            (a + b, None),
+            (b + a, "not sorted"),
+            (a + a, "repeated"),
+            (a, "only 1 distinct"),
+            (a + "# x\n" + b.replace(" BB", " B"), "line:2 - bad data."),
+            (a + b.replace(" 3 1 ", " 3 2 "), "sub type 2"),
+            (a + b.replace("0011 4", "0010 4"), "bit 0"),
+            (a + b.replace(" 4 3", " 99 3"), "IR length 99"),
+            (a + b.replace(" 4 3", " 4 9"), "family type 9")]:
+        problems = check_text(text)
+        if expect is None and problems:
+            failures.append("check %r: unexpected %s" % (text, problems))
+        elif expect is not None and not any(expect in p for p in problems):
+            failures.append("check %r: expected a problem with %r, got %s"
+                            % (text, expect, problems))
+    return failures
+
+
 # ---------------------------------------------------------------------------
 
 def main(argv):
@@ -1427,8 +1563,16 @@ def main(argv):
                     help="avarice program whose --known-devices list confirms AVR part numbers")
     ap.add_argument("-o", "--output", default=os.path.join(here, "..", "data", "idcode.lst"))
     ap.add_argument("--check", metavar="FILE", help="only validate FILE and exit")
+    ap.add_argument("--self-test", action="store_true", help="test the validation and exit")
     ap.add_argument("-v", "--verbose", action="store_true", help="print every conflict")
     args = ap.parse_args(argv)
+
+    if args.self_test:
+        failures = self_test()
+        for f in failures:
+            print("self-test: " + f)
+        print("self-test: %s" % ("FAILED" if failures else "OK"))
+        return 1 if failures else 0
 
     if args.check:
         problems = check_file(args.check)
@@ -1477,6 +1621,8 @@ def main(argv):
     files = [("openocd", ocd_files), ("urjtag", urj_files)]
     if x3_origin:
         files.append(("xc3sprog", [x3_origin]))
+    if avr_c:
+        files.append(("avrdude", [args.avrdude_conf]))
     if ofl_origin:
         files.append(("openfpgaloader", [ofl_origin]))
     out = header(args, counts, files) + [format_line(e) for e in entries]
