@@ -1241,7 +1241,9 @@ def make_entry(value, all_versions, irlen, name, name_claims, claims):
         name = "MFR%03X_PART%04X" % (subtype, (value >> 12) & 0xFFFF)
     sources = sorted({c.source for c in claims} | {NAME_RANK_LABEL[n.rank] for n in name_claims
                                                    if n.rank == NAME_OFL})
-    origin = sorted({c.origin for c in claims if c.origin})
+    # Name a chip's own file before the board files that reuse its ID.
+    origin = sorted({c.origin for c in claims if c.origin},
+                    key=lambda o: (o.startswith("board" + os.sep), o))
     fam = pick_family(name_claims, None)
     if fam == FAMILY_UNKNOWN and any(c.source == SOURCE_XC3SPROG for c in claims):
         fam = xc3sprog_family(name)
