@@ -12,9 +12,16 @@ using Kind = BsdlToken::Kind;
 // value means the statement before it lacks its ';'.
 bool beginsStatement(const BsdlToken& token)
 {
-    return token.isKeyword("attribute") || token.isKeyword("constant") || token.isKeyword("end") ||
-           token.isKeyword("entity") || token.isKeyword("generic") || token.isKeyword("port") ||
-           token.isKeyword("use");
+    if (token.kind != Kind::Identifier) return false;
+    switch (token.text.size()) { // most identifiers are ruled out by length
+    case 3: return token.isKeyword("end") || token.isKeyword("use");
+    case 4: return token.isKeyword("port");
+    case 6: return token.isKeyword("entity");
+    case 7: return token.isKeyword("generic");
+    case 8: return token.isKeyword("constant");
+    case 9: return token.isKeyword("attribute");
+    default: return false;
+    }
 }
 
 } // namespace

@@ -14,6 +14,9 @@ namespace {
 using jexbsdl::BsdlDiagnostics;
 
 // Reads the whole file; false (with an error message raised) when it cannot.
+// The buffer is sized once from the file's length where the file has one,
+// then whatever else the file holds (a pipe, a file still growing) is read
+// on in chunks, up to the size limit.
 bool readFile(const char* path, std::string& content, BsdlDiagnostics& diagnostics)
 {
     std::FILE* file = std::fopen(path, "rb");
@@ -22,14 +25,28 @@ bool readFile(const char* path, std::string& content, BsdlDiagnostics& diagnosti
         return false;
     }
     std::unique_ptr<std::FILE, int (*)(std::FILE*)> closer(file, &std::fclose);
+    const auto tooLarge = [&] {
+        diagnostics.error(0, "the file is larger than " + std::to_string(BsdlReader::kMaxFileSize >> 20) +
+                                 " MiB; it is not read");
+    };
+    if (std::fseek(file, 0, SEEK_END) == 0) {
+        // A length beyond the limit is not trusted (directories report
+        // huge ones): the chunked read below finds out what is there.
+        const long length = std::ftell(file);
+        if (std::fseek(file, 0, SEEK_SET) != 0) {
+            diagnostics.report(0, std::string("cannot be read: ") + std::strerror(errno));
+            return false;
+        }
+        if (length > 0 && static_cast<unsigned long>(length) <= BsdlReader::kMaxFileSize) {
+            content.resize(static_cast<size_t>(length));
+            content.resize(std::fread(&content[0], 1, content.size(), file));
+        }
+    }
     char chunk[65536];
-    for (;;) {
+    while (!std::ferror(file) && !std::feof(file)) {
         const size_t n = std::fread(chunk, 1, sizeof chunk, file);
-        if (content.size() + n > BsdlReader::kMaxFileSize)
-            diagnostics.error(0, "the file is larger than " + std::to_string(BsdlReader::kMaxFileSize >> 20) +
-                                     " MiB; it is not read");
+        if (content.size() + n > BsdlReader::kMaxFileSize) tooLarge();
         content.append(chunk, n);
-        if (n < sizeof chunk) break;
     }
     if (std::ferror(file)) {
         diagnostics.report(0, std::string("cannot be read: ") + std::strerror(errno));
