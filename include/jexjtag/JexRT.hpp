@@ -1,0 +1,11 @@
+#pragma once
+// JexRT.hpp - the C++ class interface of libJexJtag, for hosts that link
+// against it as a class library.  Everything here is in namespace JexRT
+// (Jex_Exception aside).  The C API (jexjtag.h) is the primary interface;
+// this header adds the session listener, the device-database classes and
+// the scoped target lock.
+
+#include "jexjtag.h"
+#include "rt/Jex_Exception.hpp"
+#include "rt/SessionMessageListener.hpp"
+#include "rt/Sessions.hpp"

@@ -1,0 +1,31 @@
+#pragma once
+// The boundary of every exported function: no exception leaves the library.
+// An exception that reaches it is logged at level 1 and becomes JEX_FAILURE.
+
+#include <exception>
+#include <new>
+
+#include "jexjtag/rt/Jex_Exception.hpp"
+#include "jexjtag/types.h"
+#include "util/Logger.hpp"
+
+namespace JexRT {
+
+template <typename Body>
+unsigned guardedCall(const char* function, Body&& body) noexcept
+{
+    try {
+        return body();
+    } catch (const Jex_Exception& e) {
+        Logger::logger.printLog(1, "%s() - %s\n", function, e.getMessage().c_str());
+    } catch (const std::bad_alloc&) {
+        Logger::logger.printLog(1, "%s() - out of memory\n", function);
+    } catch (const std::exception& e) {
+        Logger::logger.printLog(1, "%s() - %s\n", function, e.what());
+    } catch (...) {
+        Logger::logger.printLog(1, "%s() - unexpected exception\n", function);
+    }
+    return JEX_FAILURE;
+}
+
+} // namespace JexRT

@@ -1,0 +1,79 @@
+#include "session/Session.hpp"
+
+#include <cstdio>
+
+#include "session/InternalSessionMessageListener.hpp"
+#include "session/MessageManager.hpp"
+#include "util/Jex_Util.hpp"
+
+namespace JexRT {
+
+Session::Session(unsigned handle, JexMessageCallback msgCallback, const std::vector<std::string>& args)
+{
+    try {
+        init(handle, msgCallback, args);
+    } catch (...) {
+        release();
+        throw;
+    }
+}
+
+Session::~Session() { release(); }
+
+void Session::init(unsigned handle, JexMessageCallback msgCallback, const std::vector<std::string>& args)
+{
+    m_handle = handle;
+    m_msgCallback = msgCallback;
+    m_args.insert(m_args.end(), args.begin(), args.end());
+
+    m_messageListener = std::make_unique<InternalSessionMessageListener>(this);
+    MessageManager::getInstance().addListener(m_messageListener.get());
+
+    const std::string dataDir = Jex_Util::findKey(m_args, "datadir");
+    if (!dataDir.empty()) Jex_Util::setUserDataDirPath(dataDir);
+}
+
+void Session::release()
+{
+    m_msgCallback = nullptr;
+    m_handle = 0;
+    m_args.clear();
+    if (m_messageListener) {
+        MessageManager::getInstance().removeListener(m_messageListener.get());
+        m_messageListener.reset();
+    }
+}
+
+void Session::sendMessage(unsigned msgType, const std::string& text)
+{
+    if (m_msgCallback) {
+        m_msgCallback(m_handle, msgType, text.c_str());
+        return;
+    }
+    if (msgType == JEX_MSG_SILENT) return;
+    const char* prefix = "";
+    switch (msgType) {
+    case JEX_MSG_ERROR: prefix = "Error:"; break;
+    case JEX_MSG_WARNING: prefix = "Warning:"; break;
+    case JEX_MSG_STATUS: prefix = "Status:"; break;
+    case JEX_MSG_INFO: prefix = "Info:"; break;
+    default: break;
+    }
+    std::fputs(prefix, stdout);
+    std::fwrite(text.data(), 1, text.size(), stdout);
+    std::fflush(stdout);
+}
+
+void Session::setPluginSearchPath(const std::string& path)
+{
+    m_pluginSearchPath = path;
+    refreshTargetList();
+}
+
+// Until plug-in management exists the target list is empty.
+unsigned Session::refreshTargetList() { return JEX_FAILURE; }
+unsigned Session::getTargetCount() { return 0; }
+unsigned Session::getTargetXMLSizeByIndex(unsigned) { return 0; }
+unsigned Session::getTargetByIndex(unsigned, char*, unsigned, std::string*, std::string*) { return JEX_FAILURE; }
+
+} // namespace JexRT

@@ -1,0 +1,58 @@
+#pragma once
+// Session - what a session handle stands for: the host's callback and
+// arguments, the session's message listener, its plug-in search path, and
+// the session-level operations every other layer uses.  Only the registry
+// constructs and destroys sessions.
+
+#include <memory>
+#include <string>
+#include <vector>
+
+#include "jexjtag/types.h"
+
+namespace JexRT {
+
+class InternalSessionMessageListener;
+
+class Session final {
+public:
+    // Runs init(); if init throws, everything it set up is released and the
+    // exception passes on.
+    Session(unsigned handle, JexMessageCallback msgCallback, const std::vector<std::string>& args);
+    ~Session();
+    Session(const Session&) = delete;
+    Session& operator=(const Session&) = delete;
+
+    virtual void init(unsigned handle, JexMessageCallback msgCallback, const std::vector<std::string>& args);
+    // Takes the session down to an empty shell (no callback, handle 0, no
+    // listener).
+    virtual void release();
+    virtual const char* getClassName() const { return "Session"; }
+    virtual unsigned getHandle() const { return m_handle; }
+
+    // Delivers a message to the host: its callback, or else standard output
+    // with the type's prefix ("Error:", "Warning:", "Status:", "Info:").
+    virtual void sendMessage(unsigned msgType, const std::string& text);
+
+    // Stores the host's search path, then refreshes the target list.
+    virtual void setPluginSearchPath(const std::string& path);
+    virtual std::string getPluginSearchPath() const { return m_pluginSearchPath; }
+
+    // The target list, as the plug-in manager keeps it.
+    virtual unsigned refreshTargetList();
+    virtual unsigned getTargetCount();
+    virtual unsigned getTargetXMLSizeByIndex(unsigned index);
+    virtual unsigned getTargetByIndex(unsigned index, char* xmlBuf, unsigned xmlBufLen, std::string* targetName,
+                                      std::string* pluginName);
+
+    const std::vector<std::string>& getArguments() const { return m_args; }
+
+private:
+    unsigned m_handle = 0;
+    JexMessageCallback m_msgCallback = nullptr;
+    std::vector<std::string> m_args;
+    std::string m_pluginSearchPath;
+    std::unique_ptr<InternalSessionMessageListener> m_messageListener;
+};
+
+} // namespace JexRT

@@ -1,0 +1,223 @@
+// Sessions through the exported C functions, as a host sees them.
+
+#include <gtest/gtest.h>
+
+#include <cstring>
+#include <string>
+#include <vector>
+
+#include "jexjtag/jexjtag.h"
+#include "support/TestSupport.hpp"
+
+using testsupport::IsolatedEnvironment;
+using testsupport::LogCapture;
+
+namespace {
+
+struct Received {
+    unsigned handle;
+    unsigned type;
+    std::string text;
+};
+std::vector<Received> g_received;
+
+void recordMessage(unsigned handle, unsigned type, const char* text) { g_received.push_back({handle, type, text}); }
+
+class SessionApiTest : public ::testing::Test {
+protected:
+    void SetUp() override { g_received.clear(); }
+    unsigned create(JexMessageCallback cb = nullptr, std::vector<const char*> args = {})
+    {
+        unsigned handle = 0xDEADBEEF;
+        EXPECT_EQ(JEX_SUCCESS, JexJtag_session_create(cb, static_cast<unsigned>(args.size()),
+                                                      args.empty() ? nullptr : args.data(), &handle));
+        return handle;
+    }
+    IsolatedEnvironment env;
+};
+
+TEST_F(SessionApiTest, HandlesAreHandedOutInOrderAndMaskedOnLookup)
+{
+    const unsigned first = create(recordMessage);
+    const unsigned second = create(recordMessage);
+    EXPECT_EQ(0x00010000u, first);
+    EXPECT_EQ(0x00020000u, second);
+
+    // Bits 24..31 and 8..15 are ignored; the callback sees the session's own handle.
+    EXPECT_EQ(JEX_SUCCESS, JexJtag_session_sendMessage(first | 0xAB00CD00u, JEX_MSG_INFO, "hello"));
+    // The low byte selects a target, not the session: the session is still reached.
+    EXPECT_EQ(JEX_SUCCESS, JexJtag_session_sendMessage(second | 0x01u, JEX_MSG_INFO, "again"));
+    ASSERT_EQ(2u, g_received.size());
+    EXPECT_EQ(first, g_received[0].handle);
+    EXPECT_EQ(second, g_received[1].handle);
+
+    EXPECT_EQ(JEX_SUCCESS, JexJtag_session_destroy(first));
+    EXPECT_EQ(JEX_FAILURE, JexJtag_session_destroy(first));
+    EXPECT_EQ(JEX_FAILURE, JexJtag_session_sendMessage(first, JEX_MSG_INFO, "gone"));
+    EXPECT_EQ(JEX_SUCCESS, JexJtag_session_destroy(second | 0xFF000000u));
+}
+
+TEST_F(SessionApiTest, IdsWrapAfter256AndSkipLiveSessions)
+{
+    for (unsigned i = 1; i < 256; ++i) {
+        const unsigned h = create();
+        ASSERT_EQ(i << 16, h);
+        ASSERT_EQ(JEX_SUCCESS, JexJtag_session_destroy(h));
+    }
+    EXPECT_EQ(0u, create()); // the 256th session gets handle 0, a valid handle
+    EXPECT_EQ(JEX_SUCCESS, JexJtag_session_sendMessage(0, JEX_MSG_SILENT, "x"));
+    const unsigned keep = create(); // the 257th: 0x00010000 again
+    EXPECT_EQ(0x00010000u, keep);
+    EXPECT_EQ(JEX_SUCCESS, JexJtag_session_destroy(0));
+
+    // Walk the counter round once more while 0x00010000 stays live: its id is skipped.
+    for (unsigned i = 2; i < 256; ++i) ASSERT_EQ(JEX_SUCCESS, JexJtag_session_destroy(create()));
+    ASSERT_EQ(JEX_SUCCESS, JexJtag_session_destroy(create())); // id 0
+    EXPECT_EQ(0x00020000u, create());
+}
+
+TEST_F(SessionApiTest, CreationFailsOnlyWhenAllIdsAreLive)
+{
+    std::vector<unsigned> handles;
+    for (unsigned i = 0; i < 256; ++i) handles.push_back(create());
+    unsigned handle = 0x1234;
+    EXPECT_EQ(JEX_FAILURE, JexJtag_session_create(nullptr, 0, nullptr, &handle));
+    EXPECT_EQ(0u, handle);
+    EXPECT_EQ(JEX_SUCCESS, JexJtag_session_destroy(handles[7]));
+    EXPECT_EQ(handles[7], create());
+}
+
+TEST_F(SessionApiTest, BadCreationArgumentsFailCleanly)
+{
+    EXPECT_EQ(JEX_FAILURE, JexJtag_session_create(nullptr, 0, nullptr, nullptr));
+    unsigned handle = 7;
+    EXPECT_EQ(JEX_FAILURE, JexJtag_session_create(nullptr, 2, nullptr, &handle));
+    EXPECT_EQ(0u, handle);
+    const char* withNull[] = {"a=b", nullptr};
+    EXPECT_EQ(JEX_FAILURE, JexJtag_session_create(nullptr, 2, withNull, &handle));
+    EXPECT_EQ(0u, handle);
+    // Failed creations do not advance the id counter.
+    EXPECT_EQ(0x00010000u, create());
+}
+
+TEST_F(SessionApiTest, ApiVersionRules)
+{
+    unsigned version = 0;
+    char text[200];
+    std::memset(text, 'z', sizeof text);
+    EXPECT_EQ(JEX_FAILURE, JexJtag_session_getAPIVersion(&version, text, 127));
+    EXPECT_NE(0u, version); // written before the length check
+    EXPECT_EQ('z', text[0]);
+    version = 0;
+    EXPECT_EQ(JEX_SUCCESS, JexJtag_session_getAPIVersion(&version, nullptr, 128));
+    EXPECT_NE(0u, version);
+    EXPECT_EQ(JEX_SUCCESS, JexJtag_session_getAPIVersion(nullptr, text, 128));
+    EXPECT_EQ(0, std::strncmp(text, "Version ", 8));
+    EXPECT_EQ('\0', text[127]);
+    EXPECT_EQ('z', text[128]); // only 128 bytes are touched
+}
+
+TEST_F(SessionApiTest, TooShortVersionBufferIsLogged)
+{
+    LogCapture log(1);
+    unsigned version = 0;
+    char text[16];
+    EXPECT_EQ(JEX_FAILURE, JexJtag_session_getAPIVersion(&version, text, sizeof text));
+    EXPECT_TRUE(log.has("JexJtag_session_getAPIVersion() -  versionLen is too small\n"));
+}
+
+TEST_F(SessionApiTest, PluginSearchPathBufferRule)
+{
+    const unsigned h = create();
+    const std::string path = "/opt/cables";
+    EXPECT_EQ(JEX_SUCCESS, JexJtag_session_setPluginSearchPath(h, path.c_str()));
+    char buf[64];
+    std::memset(buf, 'q', sizeof buf);
+    EXPECT_EQ(JEX_FAILURE, JexJtag_session_getPluginSearchPath(h, buf, static_cast<unsigned>(path.size())));
+    EXPECT_EQ('q', buf[0]);
+    EXPECT_EQ(JEX_SUCCESS, JexJtag_session_getPluginSearchPath(h, buf, static_cast<unsigned>(path.size() + 1)));
+    EXPECT_EQ(path, std::string(buf));
+    EXPECT_EQ(JEX_FAILURE, JexJtag_session_getPluginSearchPath(h, nullptr, 100));
+    EXPECT_EQ(JEX_FAILURE, JexJtag_session_setPluginSearchPath(h, nullptr));
+    EXPECT_EQ(JEX_FAILURE, JexJtag_session_setPluginSearchPath(0x00770000, "/x"));
+}
+
+TEST_F(SessionApiTest, EmptyTargetListAndNullOutputs)
+{
+    const unsigned h = create();
+    unsigned count = 99;
+    EXPECT_EQ(JEX_SUCCESS, JexJtag_session_getTargetCount(h, &count));
+    EXPECT_EQ(0u, count);
+    EXPECT_EQ(JEX_FAILURE, JexJtag_session_getTargetCount(h, nullptr));
+    EXPECT_EQ(JEX_FAILURE, JexJtag_session_getTargetXMLSizeByIndex(h, 0, nullptr));
+    char xml[16], name[16], plugin[16];
+    EXPECT_EQ(JEX_FAILURE, JexJtag_session_getTargetByIndex(h, 0, xml, sizeof xml, name, sizeof name, plugin,
+                                                            sizeof plugin));
+    EXPECT_EQ(JEX_SUCCESS, JexJtag_session_refreshTargetList(h));
+    EXPECT_EQ(JEX_FAILURE, JexJtag_session_refreshTargetList(h + 0x00010000));
+}
+
+TEST_F(SessionApiTest, MessagesWithoutCallbackArePrintedWithTheirPrefix)
+{
+    const unsigned h = create();
+    ::testing::internal::CaptureStdout();
+    JexJtag_session_sendMessage(h, JEX_MSG_ERROR, "bad cable\n");
+    JexJtag_session_sendMessage(h, JEX_MSG_WARNING, "w");
+    JexJtag_session_sendMessage(h, JEX_MSG_STATUS, "s");
+    JexJtag_session_sendMessage(h, JEX_MSG_INFO, "i");
+    JexJtag_session_sendMessage(h, JEX_MSG_NOISE, "n");
+    JexJtag_session_sendMessage(h, 7, "d");
+    JexJtag_session_sendMessage(h, JEX_MSG_SILENT, "never shown");
+    EXPECT_EQ("Error:bad cable\nWarning:wStatus:sInfo:ind", ::testing::internal::GetCapturedStdout());
+}
+
+TEST_F(SessionApiTest, EveryTypeReachesTheCallbackUnchanged)
+{
+    const unsigned h = create(recordMessage);
+    ::testing::internal::CaptureStdout();
+    for (unsigned type : {JEX_MSG_ERROR, JEX_MSG_WARNING, JEX_MSG_STATUS, JEX_MSG_INFO, JEX_MSG_NOISE,
+                          JEX_MSG_SILENT, 7u, 0x12345u})
+        EXPECT_EQ(JEX_SUCCESS, JexJtag_session_sendMessage(h, type, "t"));
+    EXPECT_EQ("", ::testing::internal::GetCapturedStdout());
+    ASSERT_EQ(8u, g_received.size());
+    EXPECT_EQ(JEX_MSG_SILENT, g_received[5].type);
+    EXPECT_EQ(0x12345u, g_received[7].type);
+    EXPECT_EQ(JEX_FAILURE, JexJtag_session_sendMessage(h, JEX_MSG_INFO, nullptr));
+}
+
+TEST_F(SessionApiTest, TraceLines)
+{
+    LogCapture log(3);
+    const char* args[] = {"alpha=1", "beta=two"};
+    unsigned h = 0;
+    ASSERT_EQ(JEX_SUCCESS, JexJtag_session_create(nullptr, 2, args, &h));
+    EXPECT_TRUE(log.has("JexJtag_session_create() argc=2\n"));
+    EXPECT_TRUE(log.has("JexJtag_session_create() argv[0]:alpha=1\n"));
+    EXPECT_TRUE(log.has("JexJtag_session_create() argv[1]:beta=two\n"));
+    EXPECT_TRUE(log.has("JexJtag_session_create() returning handle=65536\n"));
+
+    JexJtag_session_sendMessage(h, 7, "dbg");
+    EXPECT_TRUE(log.has("JexJtag_session_sendMessage() handle=65536, msgType=JEX_MSG_DEBUG(7): dbg\n"));
+    JexJtag_session_sendMessage(0x00420000, JEX_MSG_ERROR, "lost");
+    EXPECT_TRUE(log.has("JexJtag_session_sendMessage() handle=4325376, msgType=JEX_MSG_ERROR: lost\n"));
+
+    unsigned count = 0;
+    JexJtag_session_getTargetCount(h, &count);
+    EXPECT_TRUE(log.has("JexJtag_session_getTargetCount() handle=65536\n"));
+    EXPECT_TRUE(log.has("JexJtag_session_getTargetCount() returning count=0\n"));
+    JexJtag_session_destroy(h);
+    EXPECT_TRUE(log.has("JexJtag_session_destroy() handle=65536\n"));
+}
+
+TEST_F(SessionApiTest, LoggingOffWritesNothing)
+{
+    testsupport::TempDir dir;
+    testsupport::ScopedEnv file("JEXJTAG_LOG_FILE", (dir / "log.txt").string());
+    testsupport::ScopedEnv level("JEXJTAG_LOG_LEVEL", "0");
+    const unsigned h = create();
+    JexJtag_session_sendMessage(h, JEX_MSG_ERROR, "e");
+    JexJtag_session_destroy(h);
+    EXPECT_EQ("", testsupport::readFile(dir / "log.txt"));
+}
+
+} // namespace

@@ -1,0 +1,156 @@
+// The registry's listeners and the message path from the host layer, seen
+// from inside the library.
+
+#include <gtest/gtest.h>
+
+#include <string>
+#include <vector>
+
+#include "hostlayer/Port_MsgDispatcher.hpp"
+#include "jexjtag/JexRT.hpp"
+#include "session/PortabilityMessageInterceptor.hpp"
+#include "session/Session.hpp"
+#include "session/SessionRegistry.hpp"
+#include "support/TestSupport.hpp"
+#include "util/Version.hpp"
+
+namespace {
+
+struct Event {
+    std::string what;
+    unsigned handle;
+};
+
+class RecordingListener : public JexRT::SessionMessageListener {
+public:
+    RecordingListener(std::vector<Event>& log, std::string name) : m_log(log), m_name(std::move(name)) {}
+    void sessionCreated(unsigned handle) override { m_log.push_back({m_name + " created", handle}); }
+    void sessionDestroyed(unsigned handle) override { m_log.push_back({m_name + " destroyed", handle}); }
+
+private:
+    std::vector<Event>& m_log;
+    std::string m_name;
+};
+
+struct Delivery {
+    unsigned handle;
+    unsigned type;
+    std::string text;
+};
+std::vector<Delivery> g_deliveries;
+void deliver(unsigned handle, unsigned type, const char* text) { g_deliveries.push_back({handle, type, text}); }
+
+class SessionInternalTest : public ::testing::Test {
+protected:
+    void SetUp() override { g_deliveries.clear(); }
+    unsigned create(JexMessageCallback cb = deliver)
+    {
+        unsigned h = 0;
+        EXPECT_EQ(JEX_SUCCESS, JexRT::createSession(cb, 0, nullptr, &h));
+        return h;
+    }
+    testsupport::IsolatedEnvironment env;
+};
+
+TEST_F(SessionInternalTest, ListenersAreToldInOrderAndOnlyAfterRegistration)
+{
+    std::vector<Event> log;
+    RecordingListener a(log, "a"), b(log, "b");
+    const unsigned early = create();
+    EXPECT_EQ(JEX_SUCCESS, JexRT::addSessionMessageListener(&a));
+    EXPECT_EQ(JEX_FAILURE, JexRT::addSessionMessageListener(&a));
+    EXPECT_EQ(JEX_SUCCESS, JexRT::addSessionMessageListener(&b));
+    const unsigned late = create();
+    EXPECT_EQ(JEX_SUCCESS, JexRT::destroySession(early | 0x0000FF00u)); // told the handle as passed
+    EXPECT_EQ(JEX_FAILURE, JexRT::destroySession(early));               // nobody is told
+    EXPECT_EQ(JEX_SUCCESS, JexRT::removeSessionMessageListener(&a));
+    EXPECT_EQ(JEX_FAILURE, JexRT::removeSessionMessageListener(&a));
+    EXPECT_EQ(JEX_SUCCESS, JexRT::destroySession(late));
+
+    ASSERT_EQ(5u, log.size());
+    EXPECT_EQ("a created", log[0].what);
+    EXPECT_EQ(late, log[0].handle);
+    EXPECT_EQ("b created", log[1].what);
+    EXPECT_EQ("a destroyed", log[2].what);
+    EXPECT_EQ(early | 0x0000FF00u, log[2].handle);
+    EXPECT_EQ("b destroyed", log[3].what);
+    EXPECT_EQ("b destroyed", log[4].what);
+    EXPECT_EQ(late, log[4].handle);
+    JexRT::removeSessionMessageListener(&b);
+}
+
+TEST_F(SessionInternalTest, HostLayerMessagesReachEveryLiveSessionInCreationOrder)
+{
+    const unsigned older = create();
+    const unsigned newer = create();
+    Port_MsgDispatcher::dispatch(Port_MsgMan::MSG_DEBUG, L"quiet");
+    ASSERT_EQ(2u, g_deliveries.size());
+    EXPECT_EQ(older, g_deliveries[0].handle);
+    EXPECT_EQ(newer, g_deliveries[1].handle);
+    EXPECT_EQ(JEX_MSG_SILENT, g_deliveries[0].type);
+    EXPECT_EQ("quiet", g_deliveries[0].text);
+
+    JexRT::destroySession(older);
+    g_deliveries.clear();
+    Port_MsgDispatcher::dispatch(Port_MsgMan::MSG_TRACE, L"noise");
+    ASSERT_EQ(1u, g_deliveries.size());
+    EXPECT_EQ(newer, g_deliveries[0].handle);
+    EXPECT_EQ(JEX_MSG_NOISE, g_deliveries[0].type);
+    JexRT::destroySession(newer);
+}
+
+TEST_F(SessionInternalTest, HostLayerTypesMapToMessageTypes)
+{
+    using JexRT::PortabilityMessageInterceptor;
+    for (int t : {0, 4, 5, 6, 8}) EXPECT_EQ(JEX_MSG_ERROR, PortabilityMessageInterceptor::mapType(t)) << t;
+    EXPECT_EQ(JEX_MSG_WARNING, PortabilityMessageInterceptor::mapType(1));
+    EXPECT_EQ(JEX_MSG_INFO, PortabilityMessageInterceptor::mapType(2));
+    EXPECT_EQ(JEX_MSG_INFO, PortabilityMessageInterceptor::mapType(7));
+    EXPECT_EQ(JEX_MSG_SILENT, PortabilityMessageInterceptor::mapType(3));
+    for (int t : {-1, 9, 10, 1000}) EXPECT_EQ(JEX_MSG_NOISE, PortabilityMessageInterceptor::mapType(t)) << t;
+}
+
+TEST_F(SessionInternalTest, InterceptorTakesThePlaceOfTheDefaultManagerAndGivesItBack)
+{
+    Port_MsgMan* before = Port_MsgDispatcher::getDefaultMsgMan();
+    {
+        JexRT::PortabilityMessageInterceptor interceptor;
+        EXPECT_FALSE(Port_MsgDispatcher::removeMsgMan(before)); // no longer in the set
+        EXPECT_EQ(&interceptor, Port_MsgDispatcher::getDefaultMsgMan());
+    }
+    EXPECT_TRUE(Port_MsgDispatcher::removeMsgMan(before)); // back in the set
+    Port_MsgDispatcher::addMsgMan(before);
+}
+
+TEST_F(SessionInternalTest, LongHostLayerTextsAreCutSafely)
+{
+    const unsigned h = create();
+    const std::wstring longText(3000, L'w');
+    Port_MsgDispatcher::dispatch(Port_MsgMan::MSG_INFO, longText.c_str());
+    ASSERT_EQ(1u, g_deliveries.size());
+    EXPECT_EQ(std::string(1023, 'w'), g_deliveries[0].text);
+    JexRT::destroySession(h);
+}
+
+TEST_F(SessionInternalTest, SessionBasics)
+{
+    const unsigned h = create();
+    JexRT::Session* s = JexRT::findSession(h);
+    ASSERT_NE(nullptr, s);
+    EXPECT_STREQ("Session", s->getClassName());
+    EXPECT_EQ(h, s->getHandle());
+    EXPECT_EQ(nullptr, JexRT::findSession(h + 0x00010000u));
+    EXPECT_EQ(nullptr, JexRT::findTarget(h | 1u));
+    JexRT::destroySession(h);
+    EXPECT_EQ(nullptr, JexRT::findSession(h));
+}
+
+TEST(VersionNumber, NibblesOfTheDigits)
+{
+    EXPECT_EQ(0x9200u, versionNumberFromText("9.2"));
+    EXPECT_EQ(0x92100u, versionNumberFromText("9.2.1"));
+    EXPECT_EQ(0x1012u, versionNumberFromText("10.1.2"));
+    EXPECT_EQ(0u, versionNumberFromText(""));
+}
+
+} // namespace
