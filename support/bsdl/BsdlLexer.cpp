@@ -14,6 +14,8 @@ BsdlLexer::BsdlLexer(const char* data, size_t size, BsdlDiagnostics& diagnostics
     : m_pos(data), m_end(data + size), m_diagnostics(diagnostics)
 {
     if (!data) m_pos = m_end = nullptr;
+    // A UTF-8 byte-order mark, as editors on Windows like to write.
+    if (size >= 3 && std::memcmp(data, "\xEF\xBB\xBF", 3) == 0) m_pos += 3;
 }
 
 void BsdlLexer::skipSpaceAndComments()

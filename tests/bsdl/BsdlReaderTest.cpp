@@ -275,9 +275,10 @@ TEST(BsdlReaderText, OddButReadableTextGivesWarningsAndTheRightValues)
 TEST(BsdlReaderText, VhdlLexicalDetails)
 {
     MessageRecorder recorder;
-    // Doubled quotes inside a literal, extended identifiers, real numbers,
+    // A byte-order mark, doubled quotes inside a literal, extended identifiers, real numbers,
     // upper-case keywords, comments glued to tokens, a lone CR as a line end.
-    const std::string text = "ENTITY \\odd name\\ IS\r"
+    const std::string text = "\xEF\xBB\xBF" // UTF-8 byte-order mark
+                             "ENTITY \\odd name\\ IS\r"
                              "  ATTRIBUTE DESIGN_WARNING OF \\odd name\\ : ENTITY IS \"say \"\"hi\"\"\";--c\r"
                              "  attribute TAP_SCAN_CLOCK of TCK : signal is (2.5E+7, BOTH);\r"
                              "  attribute INSTRUCTION_LENGTH of \\odd name\\ : entity is 1_0;\r"
