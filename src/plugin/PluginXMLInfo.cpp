@@ -74,7 +74,9 @@ unsigned getPluginXMLInfo(std::string path, std::vector<std::string>& names)
     }
 
     unsigned status = JEX_FAILURE;
-    if (!jexplatform::isReadable(path))
+    // A directory passes the access check but is no descriptor (and the
+    // parser would lose memory failing on it).
+    if (!jexplatform::isReadable(path) || jexplatform::isDirectory(path))
         Logger::logger.printLog(5, "getPluginXMLInfo - Cannot open xml file: %s\n", path.c_str());
     else
         status = parseDescriptor(path, names);

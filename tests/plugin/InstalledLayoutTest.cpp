@@ -13,6 +13,9 @@
 #include "platform/DynamicLibrary.hpp"
 #include "support/TestSupport.hpp"
 
+// Libraries that stay loaded until the process ends (reachable, so no leak).
+jexplatform::DynamicLibrary* g_keptLoaded = nullptr;
+
 namespace {
 
 namespace fs = std::filesystem;
@@ -92,6 +95,10 @@ TEST(InstalledLayout, ACPluginBesideTheLibraryIsListedWithItsDescriptor)
     EXPECT_STREQ("loopback_cable", name);
     EXPECT_STREQ("loopback", plugin);
     EXPECT_EQ(JEX_SUCCESS, destroy(h));
+
+    // The copy stays loaded until the process ends: its process-wide message
+    // manager lives as long as the library does.
+    g_keptLoaded = new jexplatform::DynamicLibrary(std::move(jexjtag));
 }
 
 } // namespace

@@ -119,13 +119,13 @@ TEST(PluginXMLInfo, UnreadableDescriptorsAreReportedAtLevelFive)
         EXPECT_TRUE(log.has("getPluginXMLInfo - Cannot open xml file: " + missing + "\n"));
         EXPECT_FALSE(log.has("getPluginXMLInfo - Attempting to parse " + missing + "\n"));
     }
-    // A directory where the descriptor should be passes the access check
-    // and fails in the parser.
-    fs::create_directories(dir / "dir.xml");
+    // A directory where the descriptor should be cannot be opened either.
+    const std::string directory = (dir / "dir.xml").string();
+    fs::create_directories(directory);
     LogCapture log(5);
     Names names;
-    EXPECT_EQ(JEX_FAILURE, JexRT::getPluginXMLInfo((dir / "dir.xml").string(), names));
-    EXPECT_TRUE(log.has("getPluginXMLInfo - Parse error!\n"));
+    EXPECT_EQ(JEX_FAILURE, JexRT::getPluginXMLInfo(directory, names));
+    EXPECT_TRUE(log.has("getPluginXMLInfo - Cannot open xml file: " + directory + "\n"));
 }
 
 TEST(PluginXMLInfo, EveryCallRunsItsOwnParserCycle)
