@@ -1,5 +1,4 @@
-// The host callback table as a plug-in sees it, and the plug-in manager's
-// life with the sessions (created by the first, deleted after the last).
+// The host callback table as a plug-in sees it.
 
 #include <gtest/gtest.h>
 
@@ -113,56 +112,6 @@ TEST_F(PluginCallbacksTest, PluginLogCallsReachTheLibraryLog)
         EXPECT_FALSE(log.has("not written\n"));
     }
     Session::m_pluginManager->destroyPluginInstance("alpha_usb", instance);
-    JexRT::destroySession(h);
-}
-
-TEST_F(PluginCallbacksTest, TheFirstSessionCreatesTheManagerAndTheLastOneDeletesIt)
-{
-    ASSERT_EQ(nullptr, Session::m_pluginManager);
-    const unsigned first = createSession();
-    JexRT::PluginManager* manager = Session::m_pluginManager;
-    ASSERT_NE(nullptr, manager);
-    const unsigned second = createSession();
-    EXPECT_EQ(manager, Session::m_pluginManager);
-    EXPECT_EQ(1u, entries.count("alpha loaded"));
-
-    JexRT::destroySession(first);
-    EXPECT_EQ(manager, Session::m_pluginManager);
-    EXPECT_EQ(0u, entries.count("alpha unloaded"));
-    JexRT::destroySession(second);
-    EXPECT_EQ(nullptr, Session::m_pluginManager);
-    EXPECT_EQ(1u, entries.count("alpha unloaded"));
-
-    // Kept with the flag off, until a later session turns it on again.
-    const unsigned keeping = createSession({"unloadtargetsondestroy=FALSE"});
-    manager = Session::m_pluginManager;
-    JexRT::destroySession(keeping);
-    EXPECT_EQ(manager, Session::m_pluginManager);
-    EXPECT_EQ(1u, entries.count("alpha unloaded"));
-    const unsigned neutral = createSession({"datadir="});
-    EXPECT_EQ(manager, Session::m_pluginManager);
-    EXPECT_EQ(2u, entries.count("alpha loaded")); // shared, not loaded again
-    JexRT::destroySession(neutral);
-    EXPECT_EQ(manager, Session::m_pluginManager);
-    const unsigned unloading = createSession({"unloadtargetsondestroy=yes"});
-    JexRT::destroySession(unloading);
-    EXPECT_EQ(nullptr, Session::m_pluginManager);
-    EXPECT_EQ(2u, entries.count("alpha unloaded"));
-}
-
-TEST_F(PluginCallbacksTest, SetPluginSearchPathKeepsThePathAndRefreshesTheTreeOnce)
-{
-    const unsigned h = createSession();
-    Session* session = JexRT::findSession(h);
-    ASSERT_NE(nullptr, session);
-    tree.add("acme", "beta", "test_counting_beta", {"beta_jtag"});
-    LogCapture log(3);
-    session->setPluginSearchPath("/elsewhere/plugins");
-    EXPECT_EQ("/elsewhere/plugins", session->getPluginSearchPath());
-    EXPECT_EQ(1u, log.count("PluginManager::addAllPlugins() - Searching for Company Directories in: " +
-                            env.pluginRoot().string() + "\n"));
-    EXPECT_EQ(env.pluginRoot().string(), Session::m_pluginManager->getPluginRoot());
-    EXPECT_EQ(2u, session->getTargetCount());
     JexRT::destroySession(h);
 }
 

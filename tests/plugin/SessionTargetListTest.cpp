@@ -86,8 +86,15 @@ TEST_F(SessionTargetListTest, RefreshAndSearchPathPickUpNewPlugins)
     EXPECT_EQ(JEX_SUCCESS, JexJtag_session_refreshTargetList(h));
     EXPECT_EQ(1u, count(h));
 
+    // The search path is kept for the host; the tree walked stays the same,
+    // once per call.
     tree.add("acme", "beta", "test_counting_beta", {"beta_jtag"});
-    EXPECT_EQ(JEX_SUCCESS, JexJtag_session_setPluginSearchPath(h, "/opt/other"));
+    {
+        LogCapture log(3);
+        EXPECT_EQ(JEX_SUCCESS, JexJtag_session_setPluginSearchPath(h, "/opt/other"));
+        EXPECT_EQ(1u, log.count("PluginManager::addAllPlugins() - Searching for Company Directories in: " +
+                                env.pluginRoot().string() + "\n"));
+    }
     EXPECT_EQ(2u, count(h));
     char path[32];
     ASSERT_EQ(JEX_SUCCESS, JexJtag_session_getPluginSearchPath(h, path, sizeof path));
