@@ -57,9 +57,11 @@ VcdRecorder::VcdRecorder(const std::string& path, const SimChain& chain, uint64_
     std::fprintf(m_file, ". Device 0 is nearest TDO. $end\n$timescale 1ps $end\n$scope module jtag $end\n");
     for (unsigned p = 0; p < 4; ++p) std::fprintf(m_file, "$var wire 1 %s %s $end\n", kPinIds[p], kPinNames[p]);
     for (std::size_t d = 0; d < chain.size(); ++d) {
-        m_stateIds.push_back(identifier(d));
+        m_stateIds.push_back(identifier(2 * d));
+        m_nameIds.push_back(identifier(2 * d + 1));
         m_states.push_back(chain.device(d).state());
         std::fprintf(m_file, "$var reg 4 %s dev%zu_state $end\n", m_stateIds.back().c_str(), d);
+        std::fprintf(m_file, "$var string 1 %s dev%zu_tap $end\n", m_nameIds.back().c_str(), d);
     }
     std::fprintf(m_file, "$upscope $end\n$enddefinitions $end\n#0\n$dumpvars\n");
     for (unsigned p = 0; p < 4; ++p) std::fprintf(m_file, "%d%s\n", m_levels[p] ? 1 : 0, kPinIds[p]);
@@ -67,6 +69,7 @@ VcdRecorder::VcdRecorder(const std::string& path, const SimChain& chain, uint64_
         char bits[5];
         binary(bits, m_states[d]);
         std::fprintf(m_file, "b%s %s\n", bits, m_stateIds[d].c_str());
+        std::fprintf(m_file, "s%s %s\n", jexcable::TapController::name(m_states[d]), m_nameIds[d].c_str());
     }
     std::fprintf(m_file, "$end\n");
     m_stamped = 0;
@@ -103,6 +106,7 @@ void VcdRecorder::changeState(std::size_t device, unsigned state)
     char bits[5];
     binary(bits, state);
     std::fprintf(m_file, "b%s %s\n", bits, m_stateIds[device].c_str());
+    std::fprintf(m_file, "s%s %s\n", jexcable::TapController::name(state), m_nameIds[device].c_str());
 }
 
 void VcdRecorder::onClock(const SimChain& chain, bool tms, bool tdi, bool tdo)

@@ -4,8 +4,9 @@
 //
 // Signals, in scope "jtag": tck, tms, tdi, tdo (wires), and per device a
 // 4-bit "devN_state" holding the TAP state as numbered by JexJtagTapState
-// (0 Test-Logic-Reset ... 15 Update-IR; the header's comment lists them).
-// Device 0 is nearest TDO.  Time unit 1 ps; a TCK cycle lasts 1/frequency:
+// (0 Test-Logic-Reset ... 15 Update-IR; the header's comment lists them) and
+// a "devN_tap" string with the state's name ("Shift-DR"), a GTKWave
+// extension of VCD that GTKWave shows as text.  Device 0 is nearest TDO.  Time unit 1 ps; a TCK cycle lasts 1/frequency:
 // TCK low for the first half (TMS and TDI driven, TDO shows the bit sampled
 // at the coming edge), high for the second (TAP states move at the rising
 // edge).  Waits advance the time without clocks.
@@ -53,6 +54,7 @@ private:
     bool m_levels[4] = {false, true, true, true}; // tck, tms, tdi, tdo
     std::vector<unsigned> m_states;
     std::vector<std::string> m_stateIds;
+    std::vector<std::string> m_nameIds;
 };
 
 } // namespace jexsim

@@ -58,6 +58,12 @@ Vcd parse(const std::string& path)
             EXPECT_TRUE(vcd.names.count(id)) << token;
             if (inDumpvars) vcd.initial[vcd.names[id]] = token.substr(0, 1);
             else vcd.changes[vcd.names[id]].emplace_back(now, token.substr(0, 1));
+        } else if (vcd.definitionsEnded && token[0] == 's') {
+            std::string id;
+            in >> id;
+            EXPECT_TRUE(vcd.names.count(id)) << id;
+            if (inDumpvars) vcd.initial[vcd.names[id]] = token.substr(1);
+            else vcd.changes[vcd.names[id]].emplace_back(now, token.substr(1));
         } else if (vcd.definitionsEnded && token[0] == 'b') {
             std::string id;
             in >> id;
@@ -93,7 +99,9 @@ TEST(VcdRecorder, RecordsPinsAndEveryTapState)
     std::map<std::string, int> byName;
     for (const auto& [id, name] : vcd.names) byName[name] = vcd.widths.at(id);
     EXPECT_EQ(byName, (std::map<std::string, int>{
-                          {"tck", 1}, {"tms", 1}, {"tdi", 1}, {"tdo", 1}, {"dev0_state", 4}, {"dev1_state", 4}}));
+                          {"tck", 1}, {"tms", 1}, {"tdi", 1}, {"tdo", 1}, {"dev0_state", 4}, {"dev1_state", 4},
+                          {"dev0_tap", 1}, {"dev1_tap", 1}}));
+    EXPECT_EQ(vcd.names.size(), 8u) << "identifiers are unique";
     EXPECT_EQ(vcd.initial.at("dev0_state"), "0000");
     EXPECT_EQ(vcd.initial.at("tck"), "0");
     ASSERT_FALSE(vcd.times.empty());
@@ -114,6 +122,11 @@ TEST(VcdRecorder, RecordsPinsAndEveryTapState)
     for (const auto& [t, v] : vcd.changes.at("dev1_state")) states.push_back(v);
     EXPECT_EQ(states, (std::vector<std::string>{"0001", "0010", "0011", "0100", "0101", "1000", "0001"}));
     EXPECT_EQ(vcd.changes.at("dev0_state"), vcd.changes.at("dev1_state"));
+    EXPECT_EQ(vcd.initial.at("dev1_tap"), "Test-Logic-Reset");
+    std::vector<std::string> names;
+    for (const auto& [t, v] : vcd.changes.at("dev1_tap")) names.push_back(v);
+    EXPECT_EQ(names, (std::vector<std::string>{"Run-Test/Idle", "Select-DR-Scan", "Capture-DR", "Shift-DR", "Exit1-DR",
+                                               "Update-DR", "Run-Test/Idle"}));
     // The final time stamp closes the last cycle.
     EXPECT_EQ(vcd.times.back(), 12 * 100000u + 2000000u);
 }
