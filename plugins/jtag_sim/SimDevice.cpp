@@ -43,18 +43,6 @@ void SimDevice::capture(JexJtagTapState state)
     }
 }
 
-void SimDevice::clock(bool tms, bool tdi)
-{
-    const JexJtagTapState now = m_tap.state();
-    if (now == JEXJTAG_SHIFT_IR || now == JEXJTAG_SHIFT_DR) {
-        m_shift >>= 1;
-        if (tdi) m_shift |= uint64_t{1} << (m_shiftLength - 1);
-    } else if (now == JEXJTAG_CAPTURE_IR || now == JEXJTAG_CAPTURE_DR) {
-        capture(now);
-    }
-    enter(m_tap.clock(tms));
-}
-
 void SimDevice::enter(JexJtagTapState state)
 {
     m_shifting = state == JEXJTAG_SHIFT_IR || state == JEXJTAG_SHIFT_DR;

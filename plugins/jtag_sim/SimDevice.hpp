@@ -39,7 +39,18 @@ public:
     bool tdo() const { return m_shifting ? (m_shift & 1u) != 0 : true; }
 
     // One rising TCK edge with these TMS and TDI levels.
-    void clock(bool tms, bool tdi);
+    void clock(bool tms, bool tdi)
+    {
+        const JexJtagTapState now = m_tap.state();
+        if (m_shifting) {
+            m_shift >>= 1;
+            if (tdi) m_shift |= uint64_t{1} << (m_shiftLength - 1);
+        } else if (now == JEXJTAG_CAPTURE_IR || now == JEXJTAG_CAPTURE_DR) {
+            capture(now);
+        }
+        const JexJtagTapState next = m_tap.clock(tms);
+        if (next != now) enter(next); // staying put latches nothing
+    }
 
     // Fast path for `count` (1..64) edges in Shift-IR or Shift-DR with TMS low:
     // shifts the low `count` bits of `in` (first bit in bit 0) through the
