@@ -24,6 +24,11 @@
  * holds (n + 7) / 8 bytes.  The plug-ins shipped with the library follow
  * this order; the library itself never looks inside a buffer.
  *
+ * Device index: the devices of a chain are counted from TDO.  Device 0 is
+ * the device nearest TDO, whose IDCODE leaves first in a DR scan after
+ * Test-Logic-Reset; the last device is the one whose TDI is the cable's TDI.
+ * The plug-ins shipped with the library count so.
+ *
  * Statuses are uint32_t, failure when bit 31 is set (JEX_FAILED).  No C++
  * exception may leave a plug-in call.
  */

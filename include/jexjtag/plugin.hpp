@@ -21,6 +21,7 @@
 
 #include <cstdarg>
 #include <cstdint>
+#include <stdexcept>
 
 #include "plugin.h"
 
@@ -130,6 +131,15 @@ protected:
 private:
     uint32_t m_sessionHandle = 0;
 
+    /* The object behind an instance pointer the library passed to an
+     * operation; a null pointer becomes an exception, so the operation fails
+     * instead of crashing. */
+    static PluginBase* checked(JexPluginInstance* self)
+    {
+        if (!self) throw std::invalid_argument("null plug-in instance");
+        return from(self);
+    }
+
     /* Calls a member function, turning any exception into `onError`. */
     template <typename R, typename F>
     static R guarded(R onError, F&& call)
@@ -151,52 +161,52 @@ private:
     {
         JexPluginOps t{};
         t.openTarget = [](JexPluginInstance* s, uint32_t argc, const char** argv, JexJtagCallContext* c) {
-            return guarded(JEX_FAILURE, [&] { return from(s)->openTarget(argc, argv, c); }); };
-        t.closeTarget = [](JexPluginInstance* s) { return guarded(JEX_FAILURE, [&] { return from(s)->closeTarget(); }); };
-        t.interrogate = [](JexPluginInstance* s) { return guarded(JEX_FAILURE, [&] { return from(s)->interrogate(); }); };
-        t.getDeviceCount = [](JexPluginInstance* s) { return guarded(0u, [&] { return from(s)->getDeviceCount(); }); };
-        t.setDeviceCount = [](JexPluginInstance* s, uint32_t n) { return guarded(JEX_FAILURE, [&] { return from(s)->setDeviceCount(n); }); };
-        t.getIRLength = [](JexPluginInstance* s, uint32_t d) { return guarded(int32_t{0}, [&] { return from(s)->getIRLength(d); }); };
-        t.setIRLength = [](JexPluginInstance* s, uint32_t d, uint32_t l) { return guarded(JEX_FAILURE, [&] { return from(s)->setIRLength(d, l); }); };
-        t.getDeviceIdcode = [](JexPluginInstance* s, uint32_t d) { return guarded(0u, [&] { return from(s)->getDeviceIdcode(d); }); };
-        t.setDeviceID = [](JexPluginInstance* s, uint32_t d, uint32_t id) { return guarded(JEX_FAILURE, [&] { return from(s)->setDeviceID(d, id); }); };
-        t.getTargetInfo = [](JexPluginInstance* s, JexJtagTargetInfo* i) { return guarded(JEX_FAILURE, [&] { return from(s)->getTargetInfo(i); }); };
-        t.setSessionHandle = [](JexPluginInstance* s, uint32_t h) { return guarded(JEX_FAILURE, [&] { return from(s)->setSessionHandle(h); }); };
-        t.lockTarget = [](JexPluginInstance* s, uint32_t ms) { return guarded(JEX_FAILURE, [&] { return from(s)->lockTarget(ms); }); };
-        t.unlockTarget = [](JexPluginInstance* s) { return guarded(JEX_FAILURE, [&] { return from(s)->unlockTarget(); }); };
-        t.cleanLocks = [](JexPluginInstance* s) { return guarded(JEX_FAILURE, [&] { return from(s)->cleanLocks(); }); };
-        t.navigateTAP = [](JexPluginInstance* s, uint32_t st, uint32_t n) { return guarded(JEX_FAILURE, [&] { return from(s)->navigateTAP(st, n); }); };
+            return guarded(JEX_FAILURE, [&] { return checked(s)->openTarget(argc, argv, c); }); };
+        t.closeTarget = [](JexPluginInstance* s) { return guarded(JEX_FAILURE, [&] { return checked(s)->closeTarget(); }); };
+        t.interrogate = [](JexPluginInstance* s) { return guarded(JEX_FAILURE, [&] { return checked(s)->interrogate(); }); };
+        t.getDeviceCount = [](JexPluginInstance* s) { return guarded(0u, [&] { return checked(s)->getDeviceCount(); }); };
+        t.setDeviceCount = [](JexPluginInstance* s, uint32_t n) { return guarded(JEX_FAILURE, [&] { return checked(s)->setDeviceCount(n); }); };
+        t.getIRLength = [](JexPluginInstance* s, uint32_t d) { return guarded(int32_t{0}, [&] { return checked(s)->getIRLength(d); }); };
+        t.setIRLength = [](JexPluginInstance* s, uint32_t d, uint32_t l) { return guarded(JEX_FAILURE, [&] { return checked(s)->setIRLength(d, l); }); };
+        t.getDeviceIdcode = [](JexPluginInstance* s, uint32_t d) { return guarded(0u, [&] { return checked(s)->getDeviceIdcode(d); }); };
+        t.setDeviceID = [](JexPluginInstance* s, uint32_t d, uint32_t id) { return guarded(JEX_FAILURE, [&] { return checked(s)->setDeviceID(d, id); }); };
+        t.getTargetInfo = [](JexPluginInstance* s, JexJtagTargetInfo* i) { return guarded(JEX_FAILURE, [&] { return checked(s)->getTargetInfo(i); }); };
+        t.setSessionHandle = [](JexPluginInstance* s, uint32_t h) { return guarded(JEX_FAILURE, [&] { return checked(s)->setSessionHandle(h); }); };
+        t.lockTarget = [](JexPluginInstance* s, uint32_t ms) { return guarded(JEX_FAILURE, [&] { return checked(s)->lockTarget(ms); }); };
+        t.unlockTarget = [](JexPluginInstance* s) { return guarded(JEX_FAILURE, [&] { return checked(s)->unlockTarget(); }); };
+        t.cleanLocks = [](JexPluginInstance* s) { return guarded(JEX_FAILURE, [&] { return checked(s)->cleanLocks(); }); };
+        t.navigateTAP = [](JexPluginInstance* s, uint32_t st, uint32_t n) { return guarded(JEX_FAILURE, [&] { return checked(s)->navigateTAP(st, n); }); };
         t.shiftChainIRRead = [](JexPluginInstance* s, bool l, uint8_t* o, const uint8_t* om, uint32_t n, uint32_t e, JexJtagCallContext* c) {
-            return guarded(JEX_FAILURE, [&] { return from(s)->shiftChainIRRead(l, o, om, n, e, c); }); };
+            return guarded(JEX_FAILURE, [&] { return checked(s)->shiftChainIRRead(l, o, om, n, e, c); }); };
         t.shiftChainIRWrite = [](JexPluginInstance* s, const uint8_t* i, const uint8_t* im, uint32_t n, uint32_t e, JexJtagCallContext* c) {
-            return guarded(JEX_FAILURE, [&] { return from(s)->shiftChainIRWrite(i, im, n, e, c); }); };
+            return guarded(JEX_FAILURE, [&] { return checked(s)->shiftChainIRWrite(i, im, n, e, c); }); };
         t.shiftChainIRReadWrite = [](JexPluginInstance* s, const uint8_t* i, uint8_t* o, const uint8_t* im, const uint8_t* om, uint32_t n, uint32_t e, JexJtagCallContext* c) {
-            return guarded(JEX_FAILURE, [&] { return from(s)->shiftChainIRReadWrite(i, o, im, om, n, e, c); }); };
+            return guarded(JEX_FAILURE, [&] { return checked(s)->shiftChainIRReadWrite(i, o, im, om, n, e, c); }); };
         t.shiftChainDRRead = [](JexPluginInstance* s, bool l, uint8_t* o, const uint8_t* om, uint32_t n, uint32_t e, JexJtagCallContext* c) {
-            return guarded(JEX_FAILURE, [&] { return from(s)->shiftChainDRRead(l, o, om, n, e, c); }); };
+            return guarded(JEX_FAILURE, [&] { return checked(s)->shiftChainDRRead(l, o, om, n, e, c); }); };
         t.shiftChainDRWrite = [](JexPluginInstance* s, const uint8_t* i, const uint8_t* im, uint32_t n, uint32_t e, JexJtagCallContext* c) {
-            return guarded(JEX_FAILURE, [&] { return from(s)->shiftChainDRWrite(i, im, n, e, c); }); };
+            return guarded(JEX_FAILURE, [&] { return checked(s)->shiftChainDRWrite(i, im, n, e, c); }); };
         t.shiftChainDRReadWrite = [](JexPluginInstance* s, const uint8_t* i, uint8_t* o, const uint8_t* im, const uint8_t* om, uint32_t n, uint32_t e, JexJtagCallContext* c) {
-            return guarded(JEX_FAILURE, [&] { return from(s)->shiftChainDRReadWrite(i, o, im, om, n, e, c); }); };
+            return guarded(JEX_FAILURE, [&] { return checked(s)->shiftChainDRReadWrite(i, o, im, om, n, e, c); }); };
         t.shiftDeviceIRRead = [](JexPluginInstance* s, uint32_t d, bool l, uint8_t* o, const uint8_t* om, uint32_t n, uint32_t e, JexJtagCallContext* c) {
-            return guarded(JEX_FAILURE, [&] { return from(s)->shiftDeviceIRRead(d, l, o, om, n, e, c); }); };
+            return guarded(JEX_FAILURE, [&] { return checked(s)->shiftDeviceIRRead(d, l, o, om, n, e, c); }); };
         t.shiftDeviceIRWrite = [](JexPluginInstance* s, uint32_t d, const uint8_t* i, const uint8_t* im, uint32_t n, uint32_t e, JexJtagCallContext* c) {
-            return guarded(JEX_FAILURE, [&] { return from(s)->shiftDeviceIRWrite(d, i, im, n, e, c); }); };
+            return guarded(JEX_FAILURE, [&] { return checked(s)->shiftDeviceIRWrite(d, i, im, n, e, c); }); };
         t.shiftDeviceIRReadWrite = [](JexPluginInstance* s, uint32_t d, const uint8_t* i, uint8_t* o, const uint8_t* im, const uint8_t* om, uint32_t n, uint32_t e, JexJtagCallContext* c) {
-            return guarded(JEX_FAILURE, [&] { return from(s)->shiftDeviceIRReadWrite(d, i, o, im, om, n, e, c); }); };
+            return guarded(JEX_FAILURE, [&] { return checked(s)->shiftDeviceIRReadWrite(d, i, o, im, om, n, e, c); }); };
         t.shiftDeviceDRRead = [](JexPluginInstance* s, uint32_t d, bool l, uint8_t* o, const uint8_t* om, uint32_t n, uint32_t e, JexJtagCallContext* c) {
-            return guarded(JEX_FAILURE, [&] { return from(s)->shiftDeviceDRRead(d, l, o, om, n, e, c); }); };
+            return guarded(JEX_FAILURE, [&] { return checked(s)->shiftDeviceDRRead(d, l, o, om, n, e, c); }); };
         t.shiftDeviceDRWrite = [](JexPluginInstance* s, uint32_t d, const uint8_t* i, const uint8_t* im, uint32_t n, uint32_t e, JexJtagCallContext* c) {
-            return guarded(JEX_FAILURE, [&] { return from(s)->shiftDeviceDRWrite(d, i, im, n, e, c); }); };
+            return guarded(JEX_FAILURE, [&] { return checked(s)->shiftDeviceDRWrite(d, i, im, n, e, c); }); };
         t.shiftDeviceDRReadWrite = [](JexPluginInstance* s, uint32_t d, const uint8_t* i, uint8_t* o, const uint8_t* im, const uint8_t* om, uint32_t n, uint32_t e, JexJtagCallContext* c) {
-            return guarded(JEX_FAILURE, [&] { return from(s)->shiftDeviceDRReadWrite(d, i, o, im, om, n, e, c); }); };
-        t.flush = [](JexPluginInstance* s) { return guarded(JEX_FAILURE, [&] { return from(s)->flush(); }); };
-        t.setPin = [](JexPluginInstance* s, uint32_t p, uint32_t v) { return guarded(JEX_FAILURE, [&] { return from(s)->setPin(p, v); }); };
-        t.getPin = [](JexPluginInstance* s, uint32_t p, uint32_t* v) { return guarded(JEX_FAILURE, [&] { return from(s)->getPin(p, v); }); };
-        t.pulsePin = [](JexPluginInstance* s, uint32_t p, uint32_t n) { return guarded(JEX_FAILURE, [&] { return from(s)->pulsePin(p, n); }); };
-        t.waitTime = [](JexPluginInstance* s, uint32_t us) { return guarded(JEX_FAILURE, [&] { return from(s)->waitTime(us); }); };
+            return guarded(JEX_FAILURE, [&] { return checked(s)->shiftDeviceDRReadWrite(d, i, o, im, om, n, e, c); }); };
+        t.flush = [](JexPluginInstance* s) { return guarded(JEX_FAILURE, [&] { return checked(s)->flush(); }); };
+        t.setPin = [](JexPluginInstance* s, uint32_t p, uint32_t v) { return guarded(JEX_FAILURE, [&] { return checked(s)->setPin(p, v); }); };
+        t.getPin = [](JexPluginInstance* s, uint32_t p, uint32_t* v) { return guarded(JEX_FAILURE, [&] { return checked(s)->getPin(p, v); }); };
+        t.pulsePin = [](JexPluginInstance* s, uint32_t p, uint32_t n) { return guarded(JEX_FAILURE, [&] { return checked(s)->pulsePin(p, n); }); };
+        t.waitTime = [](JexPluginInstance* s, uint32_t us) { return guarded(JEX_FAILURE, [&] { return checked(s)->waitTime(us); }); };
         t.sendCommand = [](JexPluginInstance* s, const char* cmd, const uint8_t* in, uint32_t inLen, uint8_t* out, uint32_t* outLen, JexJtagCallContext* c) {
-            return guarded(JEX_FAILURE, [&] { return from(s)->sendCommand(cmd, in, inLen, out, outLen, c); }); };
+            return guarded(JEX_FAILURE, [&] { return checked(s)->sendCommand(cmd, in, inLen, out, outLen, c); }); };
         return t;
     }
 };
@@ -216,6 +226,7 @@ private:
     }                                                                                  \
     extern "C" JEXJTAG_PLUGIN_EXPORT uint32_t JexPlugin_destroy(JexPluginInstance* i)  \
     {                                                                                  \
+        if (!i) return JEX_FAILURE;                                                    \
         delete jexjtag::PluginBase::from(i);                                           \
         return JEX_SUCCESS;                                                            \
     }                                                                                  \
