@@ -7,5 +7,6 @@
 
 #include "jexjtag.h"
 #include "rt/Jex_Exception.hpp"
+#include "rt/JexJtagTargetLock.hpp"
 #include "rt/SessionMessageListener.hpp"
 #include "rt/Sessions.hpp"

@@ -35,6 +35,7 @@ void Session::init(unsigned handle, JexMessageCallback msgCallback, const std::v
 
 void Session::release()
 {
+    destroyTarget(0); // closes it while the host can still hear of it
     m_msgCallback = nullptr;
     m_handle = 0;
     m_args.clear();

@@ -13,6 +13,7 @@
 namespace JexRT {
 
 class InternalSessionMessageListener;
+class Target;
 
 class Session final {
 public:
@@ -29,6 +30,14 @@ public:
     virtual void release();
     virtual const char* getClassName() const { return "Session"; }
     virtual unsigned getHandle() const { return m_handle; }
+
+    // The target slot (only index 0 exists).  getTarget: the target or
+    // null.  createTarget: destroys the old target first, then stores and
+    // returns a new one (null for another index or when it cannot be
+    // made).  destroyTarget: deletes the target, which closes it.
+    virtual Target* getTarget(unsigned index) const;
+    virtual Target* createTarget(unsigned index);
+    virtual void destroyTarget(unsigned index);
 
     // Delivers a message to the host: its callback, or else standard output
     // with the type's prefix ("Error:", "Warning:", "Status:", "Info:").
@@ -49,6 +58,7 @@ public:
 
 private:
     unsigned m_handle = 0;
+    Target* m_target = nullptr; // owned; index 0
     JexMessageCallback m_msgCallback = nullptr;
     std::vector<std::string> m_args;
     std::string m_pluginSearchPath;
