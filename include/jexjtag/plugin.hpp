@@ -24,6 +24,16 @@
 
 #include "plugin.h"
 
+/* The helper's process-wide storage must stay private to each module.  Under
+ * default visibility, g++ would give the function-local statics below
+ * STB_GNU_UNIQUE binding: every module built with this header would then
+ * share one callback table, and the loader could never free any of them. */
+#if defined(__GNUC__) && !defined(_WIN32)
+#  define JEXJTAG_PLUGIN_LOCAL __attribute__((visibility("hidden")))
+#else
+#  define JEXJTAG_PLUGIN_LOCAL
+#endif
+
 namespace jexjtag {
 
 /* The host callbacks, kept for the module's lifetime. */
@@ -53,9 +63,17 @@ public:
     {
         if (table().dumpBuffer) table().dumpBuffer(level, label, bytes, length);
     }
+    static void methodEntry(const char* name)
+    {
+        if (table().logMethodEntry) table().logMethodEntry(name);
+    }
+    static void methodExit(const char* name)
+    {
+        if (table().logMethodExit) table().logMethodExit(name);
+    }
 
 private:
-    static JexPluginCallbacks& table()
+    JEXJTAG_PLUGIN_LOCAL static JexPluginCallbacks& table()
     {
         static JexPluginCallbacks callbacks{};
         return callbacks;
@@ -123,7 +141,7 @@ private:
         }
     }
 
-    static const JexPluginOps& operationTable()
+    JEXJTAG_PLUGIN_LOCAL static const JexPluginOps& operationTable()
     {
         static const JexPluginOps table = makeTable();
         return table;

@@ -13,6 +13,7 @@
 namespace JexRT {
 
 class InternalSessionMessageListener;
+class PluginManager;
 class Target;
 
 class Session final {
@@ -55,6 +56,11 @@ public:
                                       std::string* pluginName);
 
     const std::vector<std::string>& getArguments() const { return m_args; }
+
+    // The one plug-in manager of the process: created by the first
+    // session's init, deleted by the registry after the last session
+    // (unless "unloadtargetsondestroy=false").  Null while none exists.
+    static PluginManager* m_pluginManager;
 
 private:
     unsigned m_handle = 0;

@@ -4,6 +4,7 @@
 #include <array>
 #include <new>
 
+#include "plugin/PluginManager.hpp"
 #include "session/Session.hpp"
 #include "util/Jex_Util.hpp"
 #include "util/Logger.hpp"
@@ -112,6 +113,12 @@ unsigned destroySession(unsigned handle)
 
     const std::vector<SessionMessageListener*> listeners = r.listeners;
     for (SessionMessageListener* listener : listeners) listener->sessionDestroyed(handle);
+
+    // The last session takes the plug-in manager, and every module with it.
+    if (r.liveCount == 0 && r.unloadOnLastDestroy) {
+        delete Session::m_pluginManager;
+        Session::m_pluginManager = nullptr;
+    }
     return JEX_SUCCESS;
 }
 
