@@ -31,6 +31,8 @@ void Session::init(unsigned handle, JexMessageCallback msgCallback, const std::v
 
     const std::string dataDir = Jex_Util::findKey(m_args, "datadir");
     if (!dataDir.empty()) Jex_Util::setUserDataDirPath(dataDir);
+
+    m_deviceDB.init(); // the installation's idcode.lst; a session always has it
 }
 
 void Session::release()
