@@ -4,10 +4,13 @@
 // the session-level operations every other layer uses.  Only the registry
 // constructs and destroys sessions.
 
+#include <istream>
 #include <memory>
 #include <string>
 #include <vector>
 
+#include "jexjtag/rt/DeviceDB.hpp"
+#include "jexjtag/rt/IDCode.hpp"
 #include "jexjtag/types.h"
 
 namespace JexRT {
@@ -55,6 +58,15 @@ public:
     virtual unsigned getTargetByIndex(unsigned index, char* xmlBuf, unsigned xmlBufLen, std::string* targetName,
                                       std::string* pluginName);
 
+    // Reads a caller's IDCODE list from in into the device database, as user
+    // entries.  JEX_FAILURE when anything goes wrong (a bad line: the
+    // entries before it stay).
+    virtual unsigned addDeviceData(const std::string& name, std::istream& in);
+    // Looks idcode up in the device database (see SessionDevices.cpp).
+    virtual unsigned idcodeLookup(const IDCode& idcode, std::string& deviceName, unsigned* irLength,
+                                  unsigned* familyType, unsigned* familySubType, std::string& bypass,
+                                  bool* isUserList);
+
     const std::vector<std::string>& getArguments() const { return m_args; }
 
     // The one plug-in manager of the process: created by the first
@@ -69,6 +81,7 @@ private:
     std::vector<std::string> m_args;
     std::string m_pluginSearchPath;
     std::unique_ptr<InternalSessionMessageListener> m_messageListener;
+    DeviceDB m_deviceDB;
 };
 
 } // namespace JexRT
