@@ -47,7 +47,7 @@ unsigned Target::lock(unsigned msWait) { return m_impl ? m_impl->lock(msWait) : 
 
 unsigned Target::unlock() { return m_impl ? m_impl->unlock() : JEX_FAILURE; }
 
-unsigned Target::getLockStatus() { return m_impl ? m_impl->getLockStatus() : JEXJTAG_NOTARGET; }
+unsigned Target::getLockStatus() { return m_impl ? m_impl->getLockStatus() : unsigned{JEXJTAG_NOTARGET}; }
 
 unsigned Target::getInfo(JexJtagTargetInfo* info) { return m_impl ? m_impl->getInfo(info) : JEX_FAILURE; }
 
