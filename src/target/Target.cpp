@@ -1,6 +1,7 @@
 #include "target/Target.hpp"
 
 #include "jexjtag/rt/IDCode.hpp"
+#include "target/CallContextCopy.hpp"
 #include "target/Vivedoru10TargetImpl.hpp"
 
 namespace JexRT {
@@ -30,7 +31,7 @@ void Target::release()
 unsigned Target::open(const std::string& name, JexJtagCallContext* context, const std::vector<std::string>& args)
 {
     if (!m_impl) return JEX_FAILURE;
-    JexJtagCallContext copy = context ? *context : JexJtagCallContext{};
+    JexJtagCallContext copy = copyCallContext(context);
     const unsigned status = m_impl->open(name, &copy, args);
     if (!JEX_FAILED(status)) m_open = true;
     return status;
@@ -55,7 +56,7 @@ unsigned Target::sendCommand(const std::string& command, const unsigned char* in
                              unsigned char* outbuf, unsigned* outbuflen, JexJtagCallContext* context)
 {
     if (!m_impl) return JEX_FAILURE;
-    JexJtagCallContext copy = context ? *context : JexJtagCallContext{};
+    JexJtagCallContext copy = copyCallContext(context);
     return m_impl->sendCommand(command, inbuf, inbuflen, outbuf, outbuflen, &copy);
 }
 
@@ -123,7 +124,7 @@ unsigned Target::shiftChainIR(const unsigned char* tdibuf, unsigned char* tdobuf
                               unsigned exitState, JexJtagCallContext* context)
 {
     if (!m_impl) return JEX_FAILURE;
-    JexJtagCallContext copy = context ? *context : JexJtagCallContext{};
+    JexJtagCallContext copy = copyCallContext(context);
     return m_impl->shiftChainIR(tdibuf, tdobuf, bitCount, tdimask, tdomask, shiftMode, exitState, &copy);
 }
 
@@ -132,7 +133,7 @@ unsigned Target::shiftDeviceIR(unsigned deviceIndex, const unsigned char* tdibuf
                                unsigned shiftMode, unsigned exitState, JexJtagCallContext* context)
 {
     if (!m_impl) return JEX_FAILURE;
-    JexJtagCallContext copy = context ? *context : JexJtagCallContext{};
+    JexJtagCallContext copy = copyCallContext(context);
     return m_impl->shiftDeviceIR(deviceIndex, tdibuf, tdobuf, bitCount, tdimask, tdomask, shiftMode, exitState,
                                  &copy);
 }
@@ -142,7 +143,7 @@ unsigned Target::shiftChainDR(const unsigned char* tdibuf, unsigned char* tdobuf
                               unsigned exitState, JexJtagCallContext* context)
 {
     if (!m_impl) return JEX_FAILURE;
-    JexJtagCallContext copy = context ? *context : JexJtagCallContext{};
+    JexJtagCallContext copy = copyCallContext(context);
     return m_impl->shiftChainDR(tdibuf, tdobuf, bitCount, tdimask, tdomask, shiftMode, exitState, &copy);
 }
 
@@ -151,7 +152,7 @@ unsigned Target::shiftDeviceDR(unsigned deviceIndex, const unsigned char* tdibuf
                                unsigned shiftMode, unsigned exitState, JexJtagCallContext* context)
 {
     if (!m_impl) return JEX_FAILURE;
-    JexJtagCallContext copy = context ? *context : JexJtagCallContext{};
+    JexJtagCallContext copy = copyCallContext(context);
     return m_impl->shiftDeviceDR(deviceIndex, tdibuf, tdobuf, bitCount, tdimask, tdomask, shiftMode, exitState,
                                  &copy);
 }

@@ -6,6 +6,7 @@
 #include "platform/Process.hpp"
 #include "plugin/PluginManager.hpp"
 #include "session/Session.hpp"
+#include "target/CallContextCopy.hpp"
 #include "target/TapStateText.hpp"
 #include "util/Jex_Util.hpp"
 #include "util/Logger.hpp"
@@ -37,11 +38,6 @@ JexPluginInstance* createInstance(const std::string& type)
 void destroyInstance(const std::string& type, JexPluginInstance* instance)
 {
     if (Session::m_pluginManager) Session::m_pluginManager->destroyPluginInstance(type, instance);
-}
-
-JexJtagCallContext copyOf(const JexJtagCallContext* context)
-{
-    return context ? *context : JexJtagCallContext{};
 }
 
 struct ShiftNames {
@@ -126,7 +122,7 @@ unsigned Vivedoru10TargetImpl::open(const std::string& name, JexJtagCallContext*
                                     name.c_str(), PointerText(instance).c_str());
         if (auto setHandle = pluginOp(instance, &JexPluginOps::setSessionHandle, "setSessionHandle"))
             setHandle(instance, m_session ? m_session->getHandle() : 0);
-        JexJtagCallContext copy = copyOf(context);
+        JexJtagCallContext copy = copyCallContext(context);
         if (auto openTarget = pluginOp(instance, &JexPluginOps::openTarget, "openTarget"))
             result = openTarget(instance, argc, argv.data(), &copy);
         if (Logger::logger.isEnabled(3))
@@ -245,7 +241,7 @@ unsigned Vivedoru10TargetImpl::sendCommand(const std::string& command, const uns
     unsigned result = JEX_FAILURE;
     if (!hasPlugin()) return tracer.setReturnStatus(result);
 
-    JexJtagCallContext copy = copyOf(context);
+    JexJtagCallContext copy = copyCallContext(context);
     if (auto send = pluginOp(m_plugin, &JexPluginOps::sendCommand, "sendCommand"))
         result = send(m_plugin, command.c_str(), inbuf, inbuflen, outbuf, outbuflen, &copy);
 
@@ -503,7 +499,7 @@ unsigned Vivedoru10TargetImpl::shift(Register which, unsigned deviceIndex, const
     const bool writing = (shiftMode & kWriteBit) != 0;
     if (writing && Logger::logger.isEnabled(3)) Logger::logger.dumpBuffer(3, names.tdiTitle, tdibuf, bitCount);
 
-    JexJtagCallContext copy = copyOf(context);
+    JexJtagCallContext copy = copyCallContext(context);
     JexPluginInstance* const p = m_plugin;
     if (reading && writing) {
         switch (which) {
