@@ -8,7 +8,14 @@ namespace JexRT {
 
 Target::Target(Session* session) { init(session); }
 
-Target::~Target() { release(); }
+Target::~Target()
+{
+    try {
+        release();
+    } catch (...) {
+        // Nothing may leave a destructor; what the plug-in holds is lost with the target.
+    }
+}
 
 void Target::init(Session* session)
 {

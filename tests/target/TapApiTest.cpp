@@ -176,6 +176,37 @@ TEST_F(TapApiTest, ShiftTracesAndDumpsFollowTheMode)
     EXPECT_NE(std::string::npos, text.find(" 5A 5A\n"));
 }
 
+TEST_F(TapApiTest, AMegabitShiftIsDumpedWholeAtLevelFive)
+{
+    const unsigned h = openTarget();
+    constexpr unsigned kBits = 1u << 20;
+    std::vector<unsigned char> tdi(kBits / 8, 0xC3);
+    std::vector<unsigned char> tdo(kBits / 8, 0);
+    tdi.back() = 0x7E;
+    LogCapture log(5);
+    EXPECT_EQ(JEX_SUCCESS, JexJtag_tap_shiftChainDR(h, JEXJTAG_SHIFT_READWRITE, JEXJTAG_RUN_TEST_IDLE, nullptr, kBits,
+                                                    tdi.data(), tdo.data(), nullptr, nullptr));
+    EXPECT_EQ(0x5A, tdo.back());
+    const std::string text = log.text();
+    const size_t tdiAt = text.find("TDI BUFFER BEFORE SHIFTCHAINDR: (1048576 bits)\n");
+    const size_t tdoAt = text.find("TDO BUFFER AFTER SHIFTCHAINDR: (1048576 bits)\n");
+    ASSERT_NE(std::string::npos, tdiAt);
+    ASSERT_NE(std::string::npos, tdoAt);
+    ASSERT_LT(tdiAt, tdoAt);
+    // 131072 bytes, 32 to a line: the last line of each dump starts at 0x1FFE0.
+    const std::string lastTdi = "  0001FFE0:" + [] {
+        std::string bytes;
+        for (int i = 0; i < 31; ++i) bytes += " C3";
+        return bytes + " 7E\n";
+    }();
+    EXPECT_NE(std::string::npos, text.find(lastTdi, tdiAt));
+    EXPECT_LT(text.find(lastTdi, tdiAt), tdoAt);
+    EXPECT_NE(std::string::npos, text.find("  0001FFE0: 5A 5A", tdoAt));
+    EXPECT_TRUE(log.has("shiftChainDR(tdibuf=" + tracedPointer(tdi.data()) + ", tdobuf=" + tracedPointer(tdo.data()) +
+                        ", tdimask=NULL, tdomask=NULL, bitCount=1048576, shiftMode=RW, "
+                        "exitState=JEXJTAG_RUN_TEST_IDLE) returning JEX_SUCCESS\n"));
+}
+
 TEST_F(TapApiTest, ReadOnlyDumpsNoTdiAndWriteOnlyNoTdo)
 {
     const unsigned h = openTarget();
