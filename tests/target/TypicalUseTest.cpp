@@ -43,11 +43,11 @@ TEST_F(TypicalUseTest, CreateListOpenLockAutodetectShiftUnlockCloseDestroy)
     }
     ASSERT_GE(index, 0);
 
-    // The database knows the second device of the chain.
+    // The database knows the second device of the chain, not the first.
     const std::string list = bits(0x0362D093u) + " 6 1 0 SOMEFPGA\n";
     ASSERT_EQ(JEX_SUCCESS, JexJtag_db_addDeviceData(h, "mine.lst", list.c_str(), static_cast<unsigned>(list.size())));
 
-    const char* args[] = {"devices=4BA00477:4,0362D093:3"};
+    const char* args[] = {"devices=00000001:4,0362D093:3"};
     JexJtagTargetInfo info{};
     ASSERT_EQ(JEX_SUCCESS, JexJtag_target_open(h, "recording", nullptr, 1, args, &info));
     EXPECT_STREQ("recording", info.target_name);
@@ -79,7 +79,7 @@ TEST_F(TypicalUseTest, CreateListOpenLockAutodetectShiftUnlockCloseDestroy)
     const std::vector<std::string> expected = {
         "JexPlugin_create",
         "setSessionHandle handle=" + hs,
-        "openTarget argc=2 argv=[devices=4BA00477:4,0362D093:3|type=recording] handle=" + hs + " callerData=null",
+        "openTarget argc=2 argv=[devices=00000001:4,0362D093:3|type=recording] handle=" + hs + " callerData=null",
         "", // getTargetInfo, checked below
         "lockTarget msWait=1000",
         "interrogate",
