@@ -35,6 +35,8 @@ void Session::init(unsigned handle, JexMessageCallback msgCallback, const std::v
     const std::string dataDir = Jex_Util::findKey(m_args, "datadir");
     if (!dataDir.empty()) Jex_Util::setUserDataDirPath(dataDir);
 
+    m_deviceDB.init(); // the installation's idcode.lst; a session always has it
+
     // The first session creates the plug-in manager (which discovers and
     // loads the plug-ins); later sessions share it.
     if (!m_pluginManager) m_pluginManager = new PluginManager();
@@ -42,6 +44,7 @@ void Session::init(unsigned handle, JexMessageCallback msgCallback, const std::v
 
 void Session::release()
 {
+    destroyTarget(0); // closes it while the host can still hear of it
     m_msgCallback = nullptr;
     m_handle = 0;
     m_args.clear();

@@ -41,10 +41,8 @@ Session* findSession(unsigned handle) { return registry().sessions[slotOf(handle
 
 Target* findTarget(unsigned handle)
 {
-    Session* session = findSession(handle);
-    if (!session) return nullptr;
-    (void)(handle & JEX_HANDLE_TARGET_MASK);
-    return nullptr; // sessions hold no target object yet
+    const Session* session = findSession(handle);
+    return session ? session->getTarget(handle & JEX_HANDLE_TARGET_MASK) : nullptr;
 }
 
 bool noLiveSessions() { return registry().liveCount == 0; }
