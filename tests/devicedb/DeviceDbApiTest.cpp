@@ -297,3 +297,26 @@ TEST(DeviceDbSessionCreation, EmptyListGivesAnEmptyDatabase)
     EXPECT_EQ(0u, irlen);
     JexJtag_session_destroy(handle);
 }
+
+TEST(DeviceDbShippedList, RealDevicesAndAHostListThatOverridesOne)
+{
+    IsolatedEnvironment env; // its data directory holds the build's idcode.lst
+    unsigned handle = 0;
+    ASSERT_EQ(JEX_SUCCESS, JexJtag_session_create(nullptr, 0, nullptr, &handle));
+    const char* xc7a35t = "00010011011000101101000010010011"; // 0x1362D093, version 1
+    char name[64];
+    char bypass[64];
+    unsigned irlen = 0;
+    ASSERT_EQ(JEX_SUCCESS, JexJtag_db_lookupDevice(handle, xc7a35t, name, sizeof name, &irlen, bypass, sizeof bypass));
+    EXPECT_STREQ("XC7A35T", name);
+    EXPECT_EQ(6u, irlen);
+    EXPECT_STREQ("111111", bypass);
+    EXPECT_EQ(JEX_SUCCESS, JexJtag_db_getDeviceNameForIdcode(handle, kXc3s200, name, sizeof name));
+    EXPECT_STREQ("XC3S200", name);
+
+    const std::string mine = "XXXX_0011_0110_0010_1101_0000_1001_0011 6 1 73 MY_ARTIX\n";
+    EXPECT_EQ(JEX_SUCCESS, JexJtag_db_addDeviceData(handle, "mine.lst", mine.data(), static_cast<unsigned>(mine.size())));
+    EXPECT_EQ(JEX_SUCCESS, JexJtag_db_getDeviceNameForIdcode(handle, xc7a35t, name, sizeof name));
+    EXPECT_STREQ("MY_ARTIX", name);
+    JexJtag_session_destroy(handle);
+}
