@@ -57,9 +57,14 @@ TEST(InstalledLayout, ACPluginBesideTheLibraryIsListedWithItsDescriptor)
     ScopedUnset pluginDir("JEXJTAG_PLUGIN_DIR");
 
     // <prefix>/lib/libJexJtag.so and <prefix>/lib/plugins/example/loopback/.
+    ScopedUnset dataDir("JEXJTAG_DATA_DIR");
     const fs::path lib = prefix / "lib";
     fs::create_directories(lib);
     fs::copy_file(fs::canonical(fs::path(JEXJTAG_TEST_BUILD_DIR) / "lib" / "libJexJtag.so"), lib / "libJexJtag.so");
+    // <prefix>/share/jexjtag/idcode.lst: every session reads the installation's list.
+    fs::create_directories(prefix / "share" / "jexjtag");
+    fs::copy_file(fs::path(JEXJTAG_TEST_BUILD_DIR) / "share" / "jexjtag" / "idcode.lst",
+                  prefix / "share" / "jexjtag" / "idcode.lst");
     testsupport::PluginTree tree(lib / "plugins");
     const std::string descriptor = "<?xml version=\"1.0\"?>\n"
                                    "<JexPlugin>\n"
