@@ -9,9 +9,10 @@ namespace JexRT {
 
 MessageManager& MessageManager::getInstance()
 {
-    // Never destroyed: the interceptor stays installed while the library is
-    // loaded, and messages raised during static destruction find a manager.
-    static MessageManager* instance = new MessageManager();
+    // Lives until the library is unloaded; its destruction uninstalls the
+    // interceptor and gives the dispatcher its previous default manager back.
+    // The dispatcher is set up inside the constructor, so it outlives this.
+    static const std::unique_ptr<MessageManager> instance(new MessageManager());
     return *instance;
 }
 

@@ -1,7 +1,7 @@
 #pragma once
 // The process-wide message manager: the listeners of all live sessions, and
 // the interceptor that brings the host layer's messages to them.  Created on
-// first use and kept while the library is loaded.
+// first use and kept until the library is unloaded.
 
 #include <memory>
 #include <vector>

@@ -1,0 +1,24 @@
+#!/usr/bin/env bash
+# Sets everything up and runs every test twice: a normal build, and an
+# AddressSanitizer + UndefinedBehaviorSanitizer build.  Then runs each fuzzer
+# for FUZZ_SECONDS (default 60) when there are any.
+set -euo pipefail
+here="$(cd "$(dirname "$0")/.." && pwd)"
+"$here/scripts/setup.sh"
+
+run_suite() {
+  local dir="$1"; shift
+  echo "=== build $(basename "$dir")"
+  "$here/scripts/build.sh" "$dir" "$@"
+  echo "=== test $(basename "$dir")"
+  (cd "$dir" && ctest --output-on-failure -j"$(nproc)")
+}
+
+run_suite "$here/build" -DCMAKE_BUILD_TYPE=RelWithDebInfo
+ASAN_OPTIONS=detect_leaks=1 UBSAN_OPTIONS=print_stacktrace=1:halt_on_error=1 \
+  run_suite "$here/build-asan" -DCMAKE_BUILD_TYPE=Debug -DJEXJTAG_SANITIZE=ON -DJEXJTAG_BUILD_BENCHMARKS=OFF
+
+if [ -x "$here/scripts/run-fuzzers.sh" ]; then
+  "$here/scripts/run-fuzzers.sh" "$here/build-fuzz"
+fi
+echo "=== all tests passed"
