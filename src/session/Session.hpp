@@ -27,6 +27,13 @@ public:
     // Takes the session down to an empty shell (no callback, handle 0, no
     // listener).
     virtual void release();
+    // Reads the BSDL file at `path`: the entity name, the instruction
+    // length, the IDCODE register text ("" when the device has none) and
+    // the first BYPASS opcode, each text cut to 2047 characters.  On
+    // failure the host gets an error message and outputs written before the
+    // failure keep their values.  JEX_SUCCESS or JEX_FAILURE.
+    virtual unsigned parseBSDLFromFile(const std::string& path, std::string& deviceName, unsigned* irlength,
+                                       std::string& idcode, std::string& bypass);
     virtual const char* getClassName() const { return "Session"; }
     virtual unsigned getHandle() const { return m_handle; }
 
@@ -44,6 +51,13 @@ public:
     virtual unsigned getTargetXMLSizeByIndex(unsigned index);
     virtual unsigned getTargetByIndex(unsigned index, char* xmlBuf, unsigned xmlBufLen, std::string* targetName,
                                       std::string* pluginName);
+
+    // The same for a BSDL text in memory: it is written to a temporary file
+    // named after the base name of `filename` in the per-user ".lumenfold"
+    // directory, read from there, and the file is removed again.
+    virtual unsigned parseBSDLFromBuffer(const std::string& filename, const char* buf, unsigned bufLen,
+                                         std::string& deviceName, unsigned* irlength, std::string& idcode,
+                                         std::string& bypass);
 
     const std::vector<std::string>& getArguments() const { return m_args; }
 

@@ -1,0 +1,298 @@
+// BSDL import through the exported C functions, as a host sees it: values,
+// messages, buffer rules, trace lines and the temporary copy in
+// $HOME/.lumenfold.
+
+#include <gtest/gtest.h>
+
+#include <cstring>
+#include <filesystem>
+#include <fstream>
+#include <sstream>
+#include <string>
+#include <vector>
+
+#include "jexjtag/jexjtag.h"
+#include "support/TestSupport.hpp"
+
+using testsupport::IsolatedEnvironment;
+using testsupport::LogCapture;
+
+namespace fs = std::filesystem;
+
+namespace {
+
+const std::string kData = BSDL_TEST_DATA_DIR;
+
+struct Received {
+    unsigned type;
+    std::string text;
+};
+std::vector<Received> g_received;
+
+void record(unsigned, unsigned type, const char* text) { g_received.push_back({type, text}); }
+
+struct Outputs {
+    Outputs() { fill('Z'); }
+    void fill(char c)
+    {
+        std::memset(name, c, sizeof name);
+        std::memset(idcode, c, sizeof idcode);
+        std::memset(bypass, c, sizeof bypass);
+        irlength = 0xABCD;
+    }
+    char name[64];
+    unsigned irlength;
+    char idcode[40];
+    char bypass[16];
+};
+
+uint32_t parseFile(unsigned handle, const std::string& path, Outputs& o)
+{
+    return JexJtag_db_parseBSDLFile(handle, path.c_str(), o.name, sizeof o.name, &o.irlength, o.idcode,
+                                    sizeof o.idcode, o.bypass, sizeof o.bypass);
+}
+
+uint32_t parseText(unsigned handle, const std::string& filename, const std::string& text, Outputs& o)
+{
+    return JexJtag_db_parseBSDL(handle, filename.c_str(), text.data(), static_cast<unsigned>(text.size()), o.name,
+                                sizeof o.name, &o.irlength, o.idcode, sizeof o.idcode, o.bypass, sizeof o.bypass);
+}
+
+bool allZero(const char* buf, size_t n)
+{
+    for (size_t i = 0; i < n; ++i)
+        if (buf[i] != '\0') return false;
+    return true;
+}
+
+bool allOf(const char* buf, size_t n, char c)
+{
+    for (size_t i = 0; i < n; ++i)
+        if (buf[i] != c) return false;
+    return true;
+}
+
+class BsdlImportTest : public ::testing::Test {
+protected:
+    void SetUp() override
+    {
+        g_received.clear();
+        fs::create_directories(env.root() / "data");
+        fs::copy_file(std::string(JEXJTAG_TEST_SOURCE_DIR) + "/data/idcode.lst", env.root() / "data/idcode.lst");
+        const std::string datadir = "datadir=" + (env.root() / "data").string() + "/";
+        const char* args[] = {datadir.c_str()};
+        ASSERT_EQ(JEX_SUCCESS, JexJtag_session_create(record, 1, args, &handle));
+    }
+    void TearDown() override { JexJtag_session_destroy(handle); }
+
+    // Whatever the import did, it left nothing in the .lumenfold directory.
+    void expectNoTemporaryFiles() const
+    {
+        const fs::path dir = env.home() / ".lumenfold";
+        if (!fs::exists(dir)) return;
+        for (const auto& entry : fs::directory_iterator(dir)) ADD_FAILURE() << "left behind: " << entry.path();
+    }
+    std::vector<std::string> messagesOf(unsigned type) const
+    {
+        std::vector<std::string> out;
+        for (const Received& r : g_received)
+            if (r.type == type) out.push_back(r.text);
+        return out;
+    }
+
+    IsolatedEnvironment env;
+    unsigned handle = 0;
+};
+
+struct ManifestRow {
+    std::string file, entity, irLength, idcode, bypass;
+};
+
+std::vector<ManifestRow> readManifest()
+{
+    std::ifstream in(kData + "/MANIFEST.tsv");
+    std::vector<ManifestRow> rows;
+    std::string line;
+    std::getline(in, line);
+    while (std::getline(in, line)) {
+        std::vector<std::string> f;
+        std::stringstream s(line);
+        std::string field;
+        while (std::getline(s, field, '\t')) f.push_back(field);
+        if (f.size() >= 5) rows.push_back({f[0], f[1], f[2], f[3], f[4]});
+    }
+    return rows;
+}
+
+} // namespace
+
+TEST_F(BsdlImportTest, EveryVendorFileFromFileAndFromMemory)
+{
+    const std::vector<ManifestRow> rows = readManifest();
+    ASSERT_GE(rows.size(), 30u);
+    for (const ManifestRow& row : rows) {
+        SCOPED_TRACE(row.file);
+        const std::string path = kData + "/" + row.file;
+        Outputs fromFile;
+        ASSERT_EQ(JEX_SUCCESS, parseFile(handle, path, fromFile));
+        EXPECT_EQ(row.entity, fromFile.name);
+        EXPECT_EQ(std::stoul(row.irLength), fromFile.irlength);
+        EXPECT_EQ(row.idcode, fromFile.idcode);
+        EXPECT_EQ(row.bypass, fromFile.bypass);
+
+        Outputs fromMemory;
+        ASSERT_EQ(JEX_SUCCESS, parseText(handle, "C:\\bsdl\\" + row.file, testsupport::readFile(path), fromMemory));
+        EXPECT_EQ(0, std::memcmp(&fromFile, &fromMemory, sizeof fromFile));
+        EXPECT_TRUE(messagesOf(JEX_MSG_ERROR).empty());
+        expectNoTemporaryFiles();
+    }
+    // The reader's warnings reach the host: a board-test header line is
+    // reported as skipped (in the temporary copy, named after the file).
+    bool headerWarning = false;
+    for (const std::string& w : messagesOf(JEX_MSG_WARNING))
+        headerWarning |= w.find("/.lumenfold/aspeed_AST2500.bsd.") != std::string::npos &&
+                         w.find("', line 1: text before the entity declaration") != std::string::npos;
+    EXPECT_TRUE(headerWarning);
+}
+
+TEST_F(BsdlImportTest, MalformedFileFailsWithTheProblemAndLeavesNoCopy)
+{
+    Outputs o;
+    EXPECT_EQ(JEX_FAILURE, parseFile(handle, kData + "/fixtures/wrong-unterminated-string.bsd", o));
+    const std::vector<std::string> errors = messagesOf(JEX_MSG_ERROR);
+    ASSERT_EQ(1u, errors.size());
+    // The message names the temporary copy (under the file's base name),
+    // the line and the problem.
+    const std::string copy = (env.home() / ".lumenfold" / "wrong-unterminated-string.bsd").string();
+    EXPECT_EQ(0u, errors[0].find("BSDL file '" + copy)) << errors[0];
+    EXPECT_NE(std::string::npos, errors[0].find("', line 32: string literal is not closed")) << errors[0];
+    EXPECT_TRUE(allZero(o.name, sizeof o.name));
+    EXPECT_TRUE(allZero(o.idcode, sizeof o.idcode));
+    EXPECT_TRUE(allZero(o.bypass, sizeof o.bypass));
+    EXPECT_EQ(0u, o.irlength);
+    expectNoTemporaryFiles();
+
+    // A text that is not BSDL at all: no reader.
+    g_received.clear();
+    EXPECT_EQ(JEX_FAILURE, parseText(handle, "notes.txt", "just some notes\n", o));
+    ASSERT_FALSE(messagesOf(JEX_MSG_ERROR).empty());
+    EXPECT_EQ("Could not obtain a BsdlReader\n", messagesOf(JEX_MSG_ERROR).back());
+    expectNoTemporaryFiles();
+
+    // Every wrong fixture fails, with an error message, and leaves no copy.
+    for (const auto& entry : fs::directory_iterator(kData + "/fixtures")) {
+        if (entry.path().filename().string().rfind("wrong-", 0) != 0) continue;
+        SCOPED_TRACE(entry.path().string());
+        g_received.clear();
+        EXPECT_EQ(JEX_FAILURE, parseFile(handle, entry.path().string(), o));
+        EXPECT_FALSE(messagesOf(JEX_MSG_ERROR).empty());
+        expectNoTemporaryFiles();
+    }
+}
+
+TEST_F(BsdlImportTest, BufferRules)
+{
+    const std::string good = kData + "/fixtures/good-missing-end.bsd";
+
+    // A file name with blanks around it is trimmed.
+    Outputs o;
+    ASSERT_EQ(JEX_SUCCESS, parseFile(handle, "  " + good + " \t", o));
+    EXPECT_STREQ("FIXTURE_DEV", o.name);
+    EXPECT_TRUE(allZero(o.name + 11, sizeof o.name - 11)); // padded with NULs
+
+    // Texts longer than their buffers are cut to size - 1 and terminated.
+    char name[5], idcode[9], bypass[3];
+    unsigned irlength = 0;
+    std::memset(name, 'Z', sizeof name);
+    ASSERT_EQ(JEX_SUCCESS, JexJtag_db_parseBSDLFile(handle, good.c_str(), name, sizeof name, &irlength, idcode,
+                                                    sizeof idcode, bypass, sizeof bypass));
+    EXPECT_STREQ("FIXT", name);
+    EXPECT_STREQ("00010000", idcode);
+    EXPECT_STREQ("11", bypass);
+    EXPECT_EQ(4u, irlength);
+
+    // Outputs not given are simply not written.
+    irlength = 0;
+    ASSERT_EQ(JEX_SUCCESS, JexJtag_db_parseBSDLFile(handle, good.c_str(), nullptr, 0, &irlength, nullptr, 0, nullptr, 0));
+    EXPECT_EQ(4u, irlength);
+
+    // A file that cannot be opened leaves every output as it was.
+    Outputs untouched;
+    EXPECT_EQ(JEX_FAILURE, parseFile(handle, kData + "/no-such-file.bsd", untouched));
+    EXPECT_TRUE(allOf(untouched.name, sizeof untouched.name, 'Z'));
+    EXPECT_TRUE(allOf(untouched.idcode, sizeof untouched.idcode, 'Z'));
+    EXPECT_EQ(0xABCDu, untouched.irlength);
+    EXPECT_EQ(JEX_FAILURE, JexJtag_db_parseBSDLFile(handle, nullptr, nullptr, 0, &irlength, nullptr, 0, nullptr, 0));
+    EXPECT_EQ(JEX_FAILURE, parseFile(handle, kData, untouched)); // a directory
+    EXPECT_TRUE(g_received.empty());
+
+    // An unknown handle clears the outputs and fails without reading anything.
+    Outputs cleared;
+    EXPECT_EQ(JEX_FAILURE, parseFile(0x00770000, good, cleared));
+    EXPECT_TRUE(allZero(cleared.name, sizeof cleared.name));
+    EXPECT_TRUE(allZero(cleared.idcode, sizeof cleared.idcode));
+    EXPECT_TRUE(allZero(cleared.bypass, sizeof cleared.bypass));
+    EXPECT_EQ(0u, cleared.irlength);
+    EXPECT_TRUE(g_received.empty());
+
+    // A null text with a length fails; a null file name is an empty one.
+    EXPECT_EQ(JEX_FAILURE, JexJtag_db_parseBSDL(handle, "x.bsd", nullptr, 10, o.name, sizeof o.name, &o.irlength,
+                                                o.idcode, sizeof o.idcode, o.bypass, sizeof o.bypass));
+    const std::string text = testsupport::readFile(good);
+    EXPECT_EQ(JEX_SUCCESS, JexJtag_db_parseBSDL(handle, nullptr, text.data(), static_cast<unsigned>(text.size()),
+                                                o.name, sizeof o.name, &o.irlength, o.idcode, sizeof o.idcode,
+                                                o.bypass, sizeof o.bypass));
+    expectNoTemporaryFiles();
+}
+
+TEST_F(BsdlImportTest, TemporaryCopyIsNamedAfterTheBaseNameAndAlwaysRemoved)
+{
+    Outputs o;
+    const std::string bad = "entity DEV is attribute INSTRUCTION_LENGTH of DEV : entity is x;";
+    const std::string dir = (env.home() / ".lumenfold").string();
+    for (const auto& [given, base] : {std::pair<std::string, std::string> {"/some/dir/dev.bsd", "dev.bsd"},
+                                      {"C:\\boards\\win.bsd", "win.bsd"},
+                                      {"plain.bsd", "plain.bsd"},
+                                      {"  ../../escape.bsd  ", "escape.bsd"}}) {
+        SCOPED_TRACE(given);
+        g_received.clear();
+        EXPECT_EQ(JEX_FAILURE, parseText(handle, given, bad, o));
+        ASSERT_EQ(1u, messagesOf(JEX_MSG_ERROR).size());
+        EXPECT_EQ(0u, messagesOf(JEX_MSG_ERROR)[0].find("BSDL file '" + dir + "/" + base + "."))
+            << messagesOf(JEX_MSG_ERROR)[0];
+        expectNoTemporaryFiles();
+    }
+
+    // When no temporary file can be made, the host is told and nothing is read.
+    fs::remove_all(dir);
+    testsupport::writeFile(dir, "in the way");
+    g_received.clear();
+    EXPECT_EQ(JEX_FAILURE, parseText(handle, "dev.bsd", testsupport::readFile(kData + "/st_CortexMx.bsd"), o));
+    ASSERT_EQ(1u, messagesOf(JEX_MSG_ERROR).size());
+    EXPECT_NE(std::string::npos, messagesOf(JEX_MSG_ERROR)[0].find(dir)) << messagesOf(JEX_MSG_ERROR)[0];
+    EXPECT_TRUE(allZero(o.name, sizeof o.name));
+    EXPECT_EQ("in the way", testsupport::readFile(dir));
+}
+
+TEST_F(BsdlImportTest, TraceLines)
+{
+    LogCapture log(3);
+    const std::string path = kData + "/st_CortexMx.bsd";
+    Outputs o;
+    ASSERT_EQ(JEX_SUCCESS, parseFile(handle, path, o));
+    std::vector<std::string> bsdlLines;
+    for (const std::string& line : log.lines())
+        if (line.rfind("JexJtag_db_", 0) == 0) bsdlLines.push_back(line);
+    const std::string h = std::to_string(handle);
+    const std::vector<std::string> expected = {
+        "JexJtag_db_parseBSDLFile() handle=" + h + ", filename=" + path + ", deviceNameLen=64, idcodeLen=40, "
+        "bypassbufLen=16\n",
+        "JexJtag_db_parseBSDL() handle=" + h + ", filename=" + path + ", bufLen=4235, deviceNameLen=64, idcodeLen=40, "
+        "bypassbufLen=16\n",
+        "JexJtag_db_parseBSDL() returning deviceName=CortexMx, irlength=4, idcode=XXXX1011101000000000010001110111, "
+        "cmd_bypass=1111\n",
+        "JexJtag_db_parseBSDLFile() returning deviceName=CortexMx, irlength=4, "
+        "idcode=XXXX1011101000000000010001110111, cmd_bypass=1111\n",
+    };
+    EXPECT_EQ(expected, bsdlLines);
+}
