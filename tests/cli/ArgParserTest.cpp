@@ -77,6 +77,9 @@ TEST(ArgParserTest, ShiftTakesRegisterDataDeviceBitsAndExitState)
     EXPECT_EQ(0u, o.device.value());
     EXPECT_EQ(32u, o.bits.value());
 
+    o = parse({"shift", "dr", "-d", "1", "--ir", "0x09", "0x0"});
+    EXPECT_EQ("0x09", o.irData.value());
+
     o = parse({"shift", "dr", "--exit=JEXJTAG_TEST_LOGIC_RESET", "--", "0b1"});
     EXPECT_EQ(0u, o.exitState);
     EXPECT_EQ("0b1", o.operands[1]);
@@ -135,6 +138,8 @@ TEST(ArgParserTest, OperandCountsAndShiftRules)
     EXPECT_EQ("'shift' needs data to shift, or --bits N to read only", usageErrorOf({"shift", "dr"}));
     EXPECT_EQ("'shift' needs ir or dr and the data to shift (3 given)", usageErrorOf({"shift", "dr", "0x1", "0x2"}));
     EXPECT_EQ("--bits needs a length from 1 to 1048576", usageErrorOf({"shift", "dr", "--bits", "0"}));
+    EXPECT_EQ("--ir goes with 'shift dr' only", usageErrorOf({"shift", "ir", "--ir", "0x1", "0x2"}));
+    EXPECT_EQ("option --ir does not apply to 'scan'", usageErrorOf({"scan", "--ir", "0x1"}));
     EXPECT_EQ("unknown command 'nosuch'", usageErrorOf({"help", "nosuch"}));
     EXPECT_NE("", usageErrorOf({"shift", "dr", "0x1", "--exit", "nowhere"}));
 }

@@ -214,8 +214,8 @@ TEST_F(CliProgramTest, ShiftDeviceRegistersOfTheDefaultChain)
     r = run({"shift", "ir", "--device", "1", "001001"});
     EXPECT_EQ("000001\n", r.out);
 
-    // After reset every device's DR path is its IDCODE register.
-    minijson::Value doc = runJson({"shift", "dr", "--device", "1", "--bits", "32"});
+    // The IDCODE instruction, then device 1's data register: its IDCODE.
+    minijson::Value doc = runJson({"shift", "dr", "--device", "1", "--ir", "0x09", "--bits", "32"});
     EXPECT_EQ("dr", doc["register"].str());
     EXPECT_EQ(1u, doc["device"].uint());
     EXPECT_EQ(32u, doc["bits"].uint());
@@ -223,6 +223,14 @@ TEST_F(CliProgramTest, ShiftDeviceRegistersOfTheDefaultChain)
     EXPECT_TRUE(doc["tdi"].isNull());
     EXPECT_EQ("0x0362D093", doc["tdo"].str());
     EXPECT_EQ("00000011011000101101000010010011", doc["tdo_bits"].str());
+    EXPECT_EQ(6u, doc["instruction"]["bits"].uint());
+    EXPECT_EQ("0x09", doc["instruction"]["tdi"].str());
+    EXPECT_EQ("0x01", doc["instruction"]["tdo"].str());
+
+    // Device 2's IDCODE opcode is 0xE0; binary data written into its data register comes back shifted through.
+    r = run({"shift", "dr", "-d", "2", "--ir", "0xE0", "0b00000000000000000000000000000000"});
+    EXPECT_EQ(0, r.exitCode) << r.err;
+    EXPECT_EQ("0b01000001000100010001000001000011\n", r.out);
 }
 
 TEST_F(CliProgramTest, ShiftTheWholeChain)

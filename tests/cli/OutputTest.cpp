@@ -182,6 +182,16 @@ TEST(ShiftOutputTest, TdoInTheNotationOfTheData)
     EXPECT_EQ("0x00", doc["tdi"].str());
     EXPECT_EQ("0x01", doc["tdo"].str());
     EXPECT_EQ("000001", doc["tdo_bits"].str());
+    EXPECT_TRUE(doc["instruction"].isNull());
+
+    BitVector instruction(4);
+    instruction.set(0, true);
+    r.instruction = ShiftResult::Instruction{DataNotation::PrefixedBinary, instruction, BitVector(4)};
+    EXPECT_EQ("0x01\n", textOf(writeShiftText, r)); // the dr shift's TDO only
+    doc = jsonOf(writeShiftJson, r);
+    EXPECT_EQ(4u, doc["instruction"]["bits"].uint());
+    EXPECT_EQ("0b0001", doc["instruction"]["tdi"].str());
+    EXPECT_EQ("0b0000", doc["instruction"]["tdo"].str());
 
     r.device.reset();
     r.tdi.reset();

@@ -28,7 +28,8 @@ enum class Id {
     NoAutodetect,
     Device,
     Bits,
-    Exit
+    Exit,
+    Ir
 };
 
 // Which commands an option applies to; kAll for the global ones.
@@ -65,6 +66,7 @@ const Spec kSpecs[] = {
     {Id::Device, "device", 'd', true, kShift},
     {Id::Bits, "bits", 'n', true, kShift},
     {Id::Exit, "exit", 0, true, kShift},
+    {Id::Ir, "ir", 0, true, kShift},
 };
 
 unsigned commandBit(Command command)
@@ -141,6 +143,10 @@ void apply(Options& options, const Spec& spec, const std::string& value)
     case Id::Device: options.device = numberValue(spec, value); break;
     case Id::Bits: options.bits = numberValue(spec, value); break;
     case Id::Exit: options.exitState = parseTapState(value); break;
+    case Id::Ir:
+        if (value.empty()) throw UsageError("--ir needs the instruction to shift");
+        options.irData = value;
+        break;
     }
 }
 
@@ -181,6 +187,7 @@ void checkOperands(Options& options)
         if (options.bits && (*options.bits == 0 || *options.bits > kMaxDataBits))
             throw UsageError("--bits needs a length from 1 to " + std::to_string(kMaxDataBits));
         if (count == 1 && !options.bits) throw UsageError("'shift' needs data to shift, or --bits N to read only");
+        if (options.irData && reg == "ir") throw UsageError("--ir goes with 'shift dr' only");
         break;
     }
     }

@@ -158,9 +158,14 @@ Options:
                      narrowed by dropping leading zeros (a 1 may not be
                      dropped); without DATA, N bits are only read (TDI 0)
       --exit STATE   TAP state to end in (default: RUN_TEST_IDLE)
+      --ir INSTR     dr only: first shift INSTR into the instruction
+                     register (device N's with --device; same notation and
+                     fitting as an ir shift), ending in RUN_TEST_IDLE.
+                     Each run opens the target anew, so an instruction a dr
+                     shift depends on is loaded in the same run this way.
       --no-autodetect  with --device: keep the IR lengths the plug-in found
       --json         {"register", "device", "bits", "exit_state", "tdi",
-                     "tdo", "tdo_bits"}
+                     "tdo", "tdo_bits", "instruction": {"bits", "tdi", "tdo"}}
   -t, --target TYPE, -a, --arg KEY=VALUE, --chain SPEC, --lock-wait MS:
                      see jexjtag --help
 
@@ -171,10 +176,11 @@ with or without the prefix JEXJTAG_, in any case, '-' for '_'
 (pause-dr), or its number 0..15.
 
 Examples:
-  jexjtag shift ir --device 1 0x09        IDCODE instruction of device 1
-  jexjtag shift dr --device 1 --bits 32   read its 32-bit IDCODE register
+  jexjtag shift ir --device 1 0x09        IDCODE instruction into device 1
+  jexjtag shift dr --device 1 --ir 0x09 --bits 32
+                                          read device 1's IDCODE register
   jexjtag shift dr 0b1011 --exit pause-dr
-  jexjtag shift dr --bits 64 --json
+  jexjtag shift dr --bits 96 --json       the whole chain's data registers
 )HELP";
 
 } // namespace

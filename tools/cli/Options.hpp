@@ -44,6 +44,7 @@ struct Options {
     // shift
     std::optional<unsigned> device;
     std::optional<unsigned> bits;
+    std::optional<std::string> irData; // --ir: instruction shifted before a dr shift
     unsigned exitState = JEXJTAG_RUN_TEST_IDLE;
 };
 

@@ -23,6 +23,15 @@ void writeShiftJson(std::ostream& out, const ShiftResult& result)
     else json.key("tdi").null();
     json.key("tdo").string(formatData(result.tdo, result.notation));
     json.key("tdo_bits").string(result.tdo.toBinary());
+    if (result.instruction) {
+        json.key("instruction").beginObject();
+        json.key("bits").number(result.instruction->tdi.size());
+        json.key("tdi").string(formatData(result.instruction->tdi, result.instruction->notation));
+        json.key("tdo").string(formatData(result.instruction->tdo, result.instruction->notation));
+        json.endObject();
+    } else {
+        json.key("instruction").null();
+    }
     json.endObject();
     json.finish();
 }

@@ -17,9 +17,16 @@ struct ShiftResult {
     DataNotation notation = DataNotation::Hex;
     std::optional<BitVector> tdi; // none: a read-only shift
     BitVector tdo;
+    // The instruction shifted first (shift dr --ir), in its own notation.
+    struct Instruction {
+        DataNotation notation = DataNotation::Hex;
+        BitVector tdi;
+        BitVector tdo;
+    };
+    std::optional<Instruction> instruction;
 };
 
-// One line: TDO.
+// One line: TDO of the register named (the dr shift's after --ir).
 void writeShiftText(std::ostream& out, const ShiftResult& result);
 void writeShiftJson(std::ostream& out, const ShiftResult& result);
 
