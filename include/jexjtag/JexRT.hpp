@@ -7,5 +7,12 @@
 
 #include "jexjtag.h"
 #include "rt/Jex_Exception.hpp"
+#include "rt/JexJtagTargetLock.hpp"
 #include "rt/SessionMessageListener.hpp"
 #include "rt/Sessions.hpp"
+#include "rt/IDCode.hpp"
+#include "rt/Jex_OneDeviceData.hpp"
+#include "rt/Jex_DeviceData.hpp"
+#include "rt/DeviceRecord.hpp"
+#include "rt/DeviceDB.hpp"
+#include "rt/Devices.hpp"

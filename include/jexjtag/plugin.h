@@ -24,6 +24,11 @@
  * holds (n + 7) / 8 bytes.  The plug-ins shipped with the library follow
  * this order; the library itself never looks inside a buffer.
  *
+ * Device index: the devices of a chain are counted from TDO.  Device 0 is
+ * the device nearest TDO, whose IDCODE leaves first in a DR scan after
+ * Test-Logic-Reset; the last device is the one whose TDI is the cable's TDI.
+ * The plug-ins shipped with the library count so.
+ *
  * Statuses are uint32_t, failure when bit 31 is set (JEX_FAILED).  No C++
  * exception may leave a plug-in call.
  */
@@ -55,6 +60,16 @@ typedef struct JexPluginCallbacks {
     void (*logMethodExit)(const char* name);
 } JexPluginCallbacks;
 
+JEXJTAG_STATIC_ASSERT(offsetof(JexPluginCallbacks, sendMessage) == 0 * sizeof(void (*)(void)),
+                      "sendMessage is the first callback");
+JEXJTAG_STATIC_ASSERT(offsetof(JexPluginCallbacks, vprintLog) == 1 * sizeof(void (*)(void)),
+                      "vprintLog is the second callback");
+JEXJTAG_STATIC_ASSERT(offsetof(JexPluginCallbacks, dumpBuffer) == 2 * sizeof(void (*)(void)),
+                      "dumpBuffer is the third callback");
+JEXJTAG_STATIC_ASSERT(offsetof(JexPluginCallbacks, logMethodEntry) == 3 * sizeof(void (*)(void)),
+                      "logMethodEntry is the fourth callback");
+JEXJTAG_STATIC_ASSERT(offsetof(JexPluginCallbacks, logMethodExit) == 4 * sizeof(void (*)(void)),
+                      "logMethodExit is the fifth callback");
 JEXJTAG_STATIC_ASSERT(sizeof(JexPluginCallbacks) == 5 * sizeof(void (*)(void)),
                       "JexPluginCallbacks holds five function pointers");
 
@@ -65,6 +80,7 @@ typedef struct JexPluginOps JexPluginOps;
 struct JexPluginInstance {
     const JexPluginOps* ops; /* must be the first member */
 };
+JEXJTAG_STATIC_ASSERT(offsetof(JexPluginInstance, ops) == 0, "an instance starts with its operation table");
 
 typedef void (*JexPluginReservedOp)(void);
 
@@ -180,7 +196,19 @@ JEXJTAG_STATIC_ASSERT(sizeof(JexPluginOps) == 69 * sizeof(JexPluginReservedOp),
                       "the operation table has 69 positions");
 
 /* ---- Module entry points --------------------------------------------------------
- * Results other than JexPlugin_create's are not looked at by the library.     */
+ * All five are required: a module lacking any one is refused (and, if it has
+ * JexPlugin_unloaded, that one is still called before the module is freed).
+ * Results other than JexPlugin_create's are not looked at by the library.
+ *
+ *   JexPlugin_create       a new instance for one of the module's target
+ *                          types, or null; the type arrives later as the
+ *                          last open argument, "type=<name>".
+ *   JexPlugin_destroy      gives back an instance that create returned.
+ *                          Never called for a null instance from create,
+ *                          and never at unload.
+ *   JexPlugin_loaded       once, right after the module is loaded.
+ *   JexPlugin_setCallbacks once, right after JexPlugin_loaded.
+ *   JexPlugin_unloaded     once, just before the module is freed.          */
 typedef JexPluginInstance* (*JexPlugin_create_fn)(void);
 typedef uint32_t (*JexPlugin_destroy_fn)(JexPluginInstance* instance);
 typedef uint32_t (*JexPlugin_loaded_fn)(void);

@@ -21,8 +21,19 @@
 
 #include <cstdarg>
 #include <cstdint>
+#include <stdexcept>
 
 #include "plugin.h"
+
+/* The helper's process-wide storage must stay private to each module.  Under
+ * default visibility, g++ would give the function-local statics below
+ * STB_GNU_UNIQUE binding: every module built with this header would then
+ * share one callback table, and the loader could never free any of them. */
+#if defined(__GNUC__) && !defined(_WIN32)
+#  define JEXJTAG_PLUGIN_LOCAL __attribute__((visibility("hidden")))
+#else
+#  define JEXJTAG_PLUGIN_LOCAL
+#endif
 
 namespace jexjtag {
 
@@ -53,9 +64,17 @@ public:
     {
         if (table().dumpBuffer) table().dumpBuffer(level, label, bytes, length);
     }
+    static void methodEntry(const char* name)
+    {
+        if (table().logMethodEntry) table().logMethodEntry(name);
+    }
+    static void methodExit(const char* name)
+    {
+        if (table().logMethodExit) table().logMethodExit(name);
+    }
 
 private:
-    static JexPluginCallbacks& table()
+    JEXJTAG_PLUGIN_LOCAL static JexPluginCallbacks& table()
     {
         static JexPluginCallbacks callbacks{};
         return callbacks;
@@ -112,6 +131,15 @@ protected:
 private:
     uint32_t m_sessionHandle = 0;
 
+    /* The object behind an instance pointer the library passed to an
+     * operation; a null pointer becomes an exception, so the operation fails
+     * instead of crashing. */
+    static PluginBase* checked(JexPluginInstance* self)
+    {
+        if (!self) throw std::invalid_argument("null plug-in instance");
+        return from(self);
+    }
+
     /* Calls a member function, turning any exception into `onError`. */
     template <typename R, typename F>
     static R guarded(R onError, F&& call)
@@ -123,7 +151,7 @@ private:
         }
     }
 
-    static const JexPluginOps& operationTable()
+    JEXJTAG_PLUGIN_LOCAL static const JexPluginOps& operationTable()
     {
         static const JexPluginOps table = makeTable();
         return table;
@@ -133,52 +161,52 @@ private:
     {
         JexPluginOps t{};
         t.openTarget = [](JexPluginInstance* s, uint32_t argc, const char** argv, JexJtagCallContext* c) {
-            return guarded(JEX_FAILURE, [&] { return from(s)->openTarget(argc, argv, c); }); };
-        t.closeTarget = [](JexPluginInstance* s) { return guarded(JEX_FAILURE, [&] { return from(s)->closeTarget(); }); };
-        t.interrogate = [](JexPluginInstance* s) { return guarded(JEX_FAILURE, [&] { return from(s)->interrogate(); }); };
-        t.getDeviceCount = [](JexPluginInstance* s) { return guarded(0u, [&] { return from(s)->getDeviceCount(); }); };
-        t.setDeviceCount = [](JexPluginInstance* s, uint32_t n) { return guarded(JEX_FAILURE, [&] { return from(s)->setDeviceCount(n); }); };
-        t.getIRLength = [](JexPluginInstance* s, uint32_t d) { return guarded(int32_t{0}, [&] { return from(s)->getIRLength(d); }); };
-        t.setIRLength = [](JexPluginInstance* s, uint32_t d, uint32_t l) { return guarded(JEX_FAILURE, [&] { return from(s)->setIRLength(d, l); }); };
-        t.getDeviceIdcode = [](JexPluginInstance* s, uint32_t d) { return guarded(0u, [&] { return from(s)->getDeviceIdcode(d); }); };
-        t.setDeviceID = [](JexPluginInstance* s, uint32_t d, uint32_t id) { return guarded(JEX_FAILURE, [&] { return from(s)->setDeviceID(d, id); }); };
-        t.getTargetInfo = [](JexPluginInstance* s, JexJtagTargetInfo* i) { return guarded(JEX_FAILURE, [&] { return from(s)->getTargetInfo(i); }); };
-        t.setSessionHandle = [](JexPluginInstance* s, uint32_t h) { return guarded(JEX_FAILURE, [&] { return from(s)->setSessionHandle(h); }); };
-        t.lockTarget = [](JexPluginInstance* s, uint32_t ms) { return guarded(JEX_FAILURE, [&] { return from(s)->lockTarget(ms); }); };
-        t.unlockTarget = [](JexPluginInstance* s) { return guarded(JEX_FAILURE, [&] { return from(s)->unlockTarget(); }); };
-        t.cleanLocks = [](JexPluginInstance* s) { return guarded(JEX_FAILURE, [&] { return from(s)->cleanLocks(); }); };
-        t.navigateTAP = [](JexPluginInstance* s, uint32_t st, uint32_t n) { return guarded(JEX_FAILURE, [&] { return from(s)->navigateTAP(st, n); }); };
+            return guarded(JEX_FAILURE, [&] { return checked(s)->openTarget(argc, argv, c); }); };
+        t.closeTarget = [](JexPluginInstance* s) { return guarded(JEX_FAILURE, [&] { return checked(s)->closeTarget(); }); };
+        t.interrogate = [](JexPluginInstance* s) { return guarded(JEX_FAILURE, [&] { return checked(s)->interrogate(); }); };
+        t.getDeviceCount = [](JexPluginInstance* s) { return guarded(0u, [&] { return checked(s)->getDeviceCount(); }); };
+        t.setDeviceCount = [](JexPluginInstance* s, uint32_t n) { return guarded(JEX_FAILURE, [&] { return checked(s)->setDeviceCount(n); }); };
+        t.getIRLength = [](JexPluginInstance* s, uint32_t d) { return guarded(int32_t{0}, [&] { return checked(s)->getIRLength(d); }); };
+        t.setIRLength = [](JexPluginInstance* s, uint32_t d, uint32_t l) { return guarded(JEX_FAILURE, [&] { return checked(s)->setIRLength(d, l); }); };
+        t.getDeviceIdcode = [](JexPluginInstance* s, uint32_t d) { return guarded(0u, [&] { return checked(s)->getDeviceIdcode(d); }); };
+        t.setDeviceID = [](JexPluginInstance* s, uint32_t d, uint32_t id) { return guarded(JEX_FAILURE, [&] { return checked(s)->setDeviceID(d, id); }); };
+        t.getTargetInfo = [](JexPluginInstance* s, JexJtagTargetInfo* i) { return guarded(JEX_FAILURE, [&] { return checked(s)->getTargetInfo(i); }); };
+        t.setSessionHandle = [](JexPluginInstance* s, uint32_t h) { return guarded(JEX_FAILURE, [&] { return checked(s)->setSessionHandle(h); }); };
+        t.lockTarget = [](JexPluginInstance* s, uint32_t ms) { return guarded(JEX_FAILURE, [&] { return checked(s)->lockTarget(ms); }); };
+        t.unlockTarget = [](JexPluginInstance* s) { return guarded(JEX_FAILURE, [&] { return checked(s)->unlockTarget(); }); };
+        t.cleanLocks = [](JexPluginInstance* s) { return guarded(JEX_FAILURE, [&] { return checked(s)->cleanLocks(); }); };
+        t.navigateTAP = [](JexPluginInstance* s, uint32_t st, uint32_t n) { return guarded(JEX_FAILURE, [&] { return checked(s)->navigateTAP(st, n); }); };
         t.shiftChainIRRead = [](JexPluginInstance* s, bool l, uint8_t* o, const uint8_t* om, uint32_t n, uint32_t e, JexJtagCallContext* c) {
-            return guarded(JEX_FAILURE, [&] { return from(s)->shiftChainIRRead(l, o, om, n, e, c); }); };
+            return guarded(JEX_FAILURE, [&] { return checked(s)->shiftChainIRRead(l, o, om, n, e, c); }); };
         t.shiftChainIRWrite = [](JexPluginInstance* s, const uint8_t* i, const uint8_t* im, uint32_t n, uint32_t e, JexJtagCallContext* c) {
-            return guarded(JEX_FAILURE, [&] { return from(s)->shiftChainIRWrite(i, im, n, e, c); }); };
+            return guarded(JEX_FAILURE, [&] { return checked(s)->shiftChainIRWrite(i, im, n, e, c); }); };
         t.shiftChainIRReadWrite = [](JexPluginInstance* s, const uint8_t* i, uint8_t* o, const uint8_t* im, const uint8_t* om, uint32_t n, uint32_t e, JexJtagCallContext* c) {
-            return guarded(JEX_FAILURE, [&] { return from(s)->shiftChainIRReadWrite(i, o, im, om, n, e, c); }); };
+            return guarded(JEX_FAILURE, [&] { return checked(s)->shiftChainIRReadWrite(i, o, im, om, n, e, c); }); };
         t.shiftChainDRRead = [](JexPluginInstance* s, bool l, uint8_t* o, const uint8_t* om, uint32_t n, uint32_t e, JexJtagCallContext* c) {
-            return guarded(JEX_FAILURE, [&] { return from(s)->shiftChainDRRead(l, o, om, n, e, c); }); };
+            return guarded(JEX_FAILURE, [&] { return checked(s)->shiftChainDRRead(l, o, om, n, e, c); }); };
         t.shiftChainDRWrite = [](JexPluginInstance* s, const uint8_t* i, const uint8_t* im, uint32_t n, uint32_t e, JexJtagCallContext* c) {
-            return guarded(JEX_FAILURE, [&] { return from(s)->shiftChainDRWrite(i, im, n, e, c); }); };
+            return guarded(JEX_FAILURE, [&] { return checked(s)->shiftChainDRWrite(i, im, n, e, c); }); };
         t.shiftChainDRReadWrite = [](JexPluginInstance* s, const uint8_t* i, uint8_t* o, const uint8_t* im, const uint8_t* om, uint32_t n, uint32_t e, JexJtagCallContext* c) {
-            return guarded(JEX_FAILURE, [&] { return from(s)->shiftChainDRReadWrite(i, o, im, om, n, e, c); }); };
+            return guarded(JEX_FAILURE, [&] { return checked(s)->shiftChainDRReadWrite(i, o, im, om, n, e, c); }); };
         t.shiftDeviceIRRead = [](JexPluginInstance* s, uint32_t d, bool l, uint8_t* o, const uint8_t* om, uint32_t n, uint32_t e, JexJtagCallContext* c) {
-            return guarded(JEX_FAILURE, [&] { return from(s)->shiftDeviceIRRead(d, l, o, om, n, e, c); }); };
+            return guarded(JEX_FAILURE, [&] { return checked(s)->shiftDeviceIRRead(d, l, o, om, n, e, c); }); };
         t.shiftDeviceIRWrite = [](JexPluginInstance* s, uint32_t d, const uint8_t* i, const uint8_t* im, uint32_t n, uint32_t e, JexJtagCallContext* c) {
-            return guarded(JEX_FAILURE, [&] { return from(s)->shiftDeviceIRWrite(d, i, im, n, e, c); }); };
+            return guarded(JEX_FAILURE, [&] { return checked(s)->shiftDeviceIRWrite(d, i, im, n, e, c); }); };
         t.shiftDeviceIRReadWrite = [](JexPluginInstance* s, uint32_t d, const uint8_t* i, uint8_t* o, const uint8_t* im, const uint8_t* om, uint32_t n, uint32_t e, JexJtagCallContext* c) {
-            return guarded(JEX_FAILURE, [&] { return from(s)->shiftDeviceIRReadWrite(d, i, o, im, om, n, e, c); }); };
+            return guarded(JEX_FAILURE, [&] { return checked(s)->shiftDeviceIRReadWrite(d, i, o, im, om, n, e, c); }); };
         t.shiftDeviceDRRead = [](JexPluginInstance* s, uint32_t d, bool l, uint8_t* o, const uint8_t* om, uint32_t n, uint32_t e, JexJtagCallContext* c) {
-            return guarded(JEX_FAILURE, [&] { return from(s)->shiftDeviceDRRead(d, l, o, om, n, e, c); }); };
+            return guarded(JEX_FAILURE, [&] { return checked(s)->shiftDeviceDRRead(d, l, o, om, n, e, c); }); };
         t.shiftDeviceDRWrite = [](JexPluginInstance* s, uint32_t d, const uint8_t* i, const uint8_t* im, uint32_t n, uint32_t e, JexJtagCallContext* c) {
-            return guarded(JEX_FAILURE, [&] { return from(s)->shiftDeviceDRWrite(d, i, im, n, e, c); }); };
+            return guarded(JEX_FAILURE, [&] { return checked(s)->shiftDeviceDRWrite(d, i, im, n, e, c); }); };
         t.shiftDeviceDRReadWrite = [](JexPluginInstance* s, uint32_t d, const uint8_t* i, uint8_t* o, const uint8_t* im, const uint8_t* om, uint32_t n, uint32_t e, JexJtagCallContext* c) {
-            return guarded(JEX_FAILURE, [&] { return from(s)->shiftDeviceDRReadWrite(d, i, o, im, om, n, e, c); }); };
-        t.flush = [](JexPluginInstance* s) { return guarded(JEX_FAILURE, [&] { return from(s)->flush(); }); };
-        t.setPin = [](JexPluginInstance* s, uint32_t p, uint32_t v) { return guarded(JEX_FAILURE, [&] { return from(s)->setPin(p, v); }); };
-        t.getPin = [](JexPluginInstance* s, uint32_t p, uint32_t* v) { return guarded(JEX_FAILURE, [&] { return from(s)->getPin(p, v); }); };
-        t.pulsePin = [](JexPluginInstance* s, uint32_t p, uint32_t n) { return guarded(JEX_FAILURE, [&] { return from(s)->pulsePin(p, n); }); };
-        t.waitTime = [](JexPluginInstance* s, uint32_t us) { return guarded(JEX_FAILURE, [&] { return from(s)->waitTime(us); }); };
+            return guarded(JEX_FAILURE, [&] { return checked(s)->shiftDeviceDRReadWrite(d, i, o, im, om, n, e, c); }); };
+        t.flush = [](JexPluginInstance* s) { return guarded(JEX_FAILURE, [&] { return checked(s)->flush(); }); };
+        t.setPin = [](JexPluginInstance* s, uint32_t p, uint32_t v) { return guarded(JEX_FAILURE, [&] { return checked(s)->setPin(p, v); }); };
+        t.getPin = [](JexPluginInstance* s, uint32_t p, uint32_t* v) { return guarded(JEX_FAILURE, [&] { return checked(s)->getPin(p, v); }); };
+        t.pulsePin = [](JexPluginInstance* s, uint32_t p, uint32_t n) { return guarded(JEX_FAILURE, [&] { return checked(s)->pulsePin(p, n); }); };
+        t.waitTime = [](JexPluginInstance* s, uint32_t us) { return guarded(JEX_FAILURE, [&] { return checked(s)->waitTime(us); }); };
         t.sendCommand = [](JexPluginInstance* s, const char* cmd, const uint8_t* in, uint32_t inLen, uint8_t* out, uint32_t* outLen, JexJtagCallContext* c) {
-            return guarded(JEX_FAILURE, [&] { return from(s)->sendCommand(cmd, in, inLen, out, outLen, c); }); };
+            return guarded(JEX_FAILURE, [&] { return checked(s)->sendCommand(cmd, in, inLen, out, outLen, c); }); };
         return t;
     }
 };
@@ -198,6 +226,7 @@ private:
     }                                                                                  \
     extern "C" JEXJTAG_PLUGIN_EXPORT uint32_t JexPlugin_destroy(JexPluginInstance* i)  \
     {                                                                                  \
+        if (!i) return JEX_FAILURE;                                                    \
         delete jexjtag::PluginBase::from(i);                                           \
         return JEX_SUCCESS;                                                            \
     }                                                                                  \

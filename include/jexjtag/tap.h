@@ -5,6 +5,12 @@
  * bit i%8 of byte i/8 and is shifted first).  The library copies no buffer
  * and computes no length.  A shift of 0 bits moves the TAP to exitState
  * instead, as JexJtag_tap_navigate(handle, exitState, 0, 0) would.
+ *
+ * shiftMode is read as two flags: bit 0 (JEXJTAG_SHIFT_READ) captures TDO
+ * into tdobuf, bit 1 (JEXJTAG_SHIFT_WRITE) drives TDI from tdibuf; a
+ * read-only shift holds TDI at the level of tdibuf's first byte (0 when
+ * tdibuf is null).  A mode with neither bit fails without reaching the
+ * plug-in.  States and modes are not checked: every value goes on.
  */
 #ifndef JEXJTAG_TAP_H
 #define JEXJTAG_TAP_H
@@ -19,6 +25,7 @@ JEXJTAG_API uint32_t JexJtag_tap_autodetectChain(unsigned handle, unsigned algor
 /* Has the plug-in scan the chain for devices, IDCODEs and IR lengths. */
 JEXJTAG_API uint32_t JexJtag_tap_interrogateChain(unsigned handle, unsigned algorithm);
 
+/* The chain's device count as the plug-in keeps it; count must not be null. */
 JEXJTAG_API uint32_t JexJtag_tap_getDeviceCount(unsigned handle, unsigned* count);
 JEXJTAG_API uint32_t JexJtag_tap_setDeviceCount(unsigned handle, unsigned count);
 
@@ -30,11 +37,14 @@ JEXJTAG_API uint32_t JexJtag_tap_getBypassCmd(unsigned handle, unsigned deviceIn
 JEXJTAG_API uint32_t JexJtag_tap_setBypassCmd(unsigned handle, unsigned deviceIndex,
                                               const char* cmd_bypass);
 
+/* A device's IR length as the plug-in answers it; *irlen (not null) is set
+ * to 0 first, also when the handle reaches no target. */
 JEXJTAG_API uint32_t JexJtag_tap_getIRLength(unsigned handle, unsigned deviceIndex, unsigned* irlen);
 JEXJTAG_API uint32_t JexJtag_tap_setIRLength(unsigned handle, unsigned deviceIndex, unsigned irlen);
 
 /* Writes the device's IDCODE as 32 '0'/'1' characters, most significant bit
- * first, NUL-filled; no terminator when idcodeLen is 32 or less. */
+ * first, NUL-filled; no terminator when idcodeLen is 32 or less.  The buffer
+ * is cleared first, also when the call fails. */
 JEXJTAG_API uint32_t JexJtag_tap_getDeviceIdcode(unsigned handle, unsigned deviceIndex,
                                                  char* idcode, unsigned idcodeLen);
 /* Overrides the device's IDCODE, given as '0'/'1' text. */
@@ -51,7 +61,8 @@ JEXJTAG_API uint32_t JexJtag_tap_shiftChainIR(unsigned handle, unsigned shiftMod
                                               void* callerData, unsigned bitCount,
                                               const unsigned char* tdibuf, unsigned char* tdobuf,
                                               const unsigned char* tdimask, const unsigned char* tdomask);
-/* Shifts the instruction register of one device; the others are put in BYPASS. */
+/* Shifts the instruction register of one device; the plug-in addresses the
+ * device (the library adds no bits for the others). */
 JEXJTAG_API uint32_t JexJtag_tap_shiftDeviceIR(unsigned handle, unsigned deviceIndex, unsigned shiftMode,
                                                unsigned exitState, void* callerData, unsigned bitCount,
                                                const unsigned char* tdibuf, unsigned char* tdobuf,

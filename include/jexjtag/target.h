@@ -12,25 +12,30 @@
 JEXJTAG_BEGIN_DECLS
 
 /* Opens a target of type targetName through the plug-in that serves it.
- * argv holds argc "key=value" texts handed to the plug-in, followed by
- * "type=<targetName>".  "AVOID_FIRMWARE_UPDATE=true" closes the target again
- * (still returning success) when the plug-in reports new firmware.  info,
- * when not null, receives the target information record.  Opening while a
- * target is open fails and closes the open one. */
+ * handle is a session handle with a low byte of 0.  argv holds argc
+ * "key=value" texts handed to the plug-in, followed by "type=<targetName>";
+ * callerData reaches the plug-in unchanged.  "AVOID_FIRMWARE_UPDATE=true"
+ * closes the target again (still returning success) when the plug-in reports
+ * new firmware.  info, when not null, receives the target information record.
+ * Opening while a target is open fails and closes the open one.  A null
+ * targetName, or a null argv (entry) within argc, fails. */
 JEXJTAG_API uint32_t JexJtag_target_open(unsigned handle, const char* targetName, void* callerData,
                                          unsigned argc, const char** argv, JexJtagTargetInfo* info);
 
-/* Closes the target and gives its plug-in instance back. */
+/* Closes the target and gives its plug-in instance back; the status is the
+ * plug-in's, but the target is gone either way.  A lock this process holds
+ * is not released first. */
 JEXJTAG_API uint32_t JexJtag_target_close(unsigned handle);
 
 /* Passes a free-form command to the plug-in.  *outbuflen holds the capacity
- * of outbuf on entry; the plug-in may change it. */
+ * of outbuf on entry; the plug-in may change it.  cmd must not be null. */
 JEXJTAG_API uint32_t JexJtag_target_sendCommand(unsigned handle, const char* cmd,
                                                 const unsigned char* inbuf, unsigned inbuflen,
                                                 unsigned char* outbuf, unsigned* outbuflen,
                                                 void* callerData);
 
-/* Sets a plug-in option (sent as the command "set" with "key=value"). */
+/* Sets a plug-in option (sent as the command "set" with "key=value").  key
+ * and value must not be null. */
 JEXJTAG_API uint32_t JexJtag_target_setOption(unsigned handle, const char* key, const char* value);
 
 /* Reads a plug-in option into value.  *valuesize holds value's capacity (at
@@ -41,19 +46,26 @@ JEXJTAG_API uint32_t JexJtag_target_getOption(unsigned handle, const char* key, 
                                               unsigned* valuesize);
 
 /* Asks the plug-in for the cross-process cable lock, waiting up to msWait
- * milliseconds; *status receives the lock status afterwards. */
+ * milliseconds; *status (not null) receives the lock status afterwards.
+ * Fails without asking the plug-in while this process holds the lock. */
 JEXJTAG_API uint32_t JexJtag_target_lock(unsigned handle, unsigned msWait, unsigned* status);
 
-/* Releases a lock this process holds. */
+/* Releases a lock this process holds; fails when it holds none. */
 JEXJTAG_API uint32_t JexJtag_target_unlock(unsigned handle);
 
-/* *status = JEXJTAG_LOCKED_ME or JEXJTAG_UNLOCKED for this process. */
+/* *status (not null) = JEXJTAG_LOCKED_ME or JEXJTAG_UNLOCKED for this
+ * process; untouched when the handle reaches no target (JEX_FAILURE). */
 JEXJTAG_API uint32_t JexJtag_target_getLockStatus(unsigned handle, unsigned* status);
 
-/* Removes stale locks of the USB cable type; fails while a target is open. */
+/* Removes stale locks of the USB cable type ("ormund_usbcable") through a
+ * temporary plug-in instance; fails, with an error message to the host,
+ * while the session has a target. */
 JEXJTAG_API uint32_t JexJtag_target_cleanLocks(unsigned handle);
 
+/* Has the plug-in send what it has queued to the cable. */
 JEXJTAG_API uint32_t JexJtag_target_flush(unsigned handle);
+/* Pin operations; pins are JexJtagPin values, other values are passed on.
+ * getPin writes *value (not null). */
 JEXJTAG_API uint32_t JexJtag_target_setPin(unsigned handle, unsigned pin, unsigned value);
 JEXJTAG_API uint32_t JexJtag_target_getPin(unsigned handle, unsigned pin, unsigned* value);
 JEXJTAG_API uint32_t JexJtag_target_pulsePin(unsigned handle, unsigned pin, unsigned count);

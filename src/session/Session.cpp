@@ -4,9 +4,12 @@
 
 #include "session/InternalSessionMessageListener.hpp"
 #include "session/MessageManager.hpp"
+#include "plugin/PluginManager.hpp"
 #include "util/Jex_Util.hpp"
 
 namespace JexRT {
+
+PluginManager* Session::m_pluginManager = nullptr;
 
 Session::Session(unsigned handle, JexMessageCallback msgCallback, const std::vector<std::string>& args)
 {
@@ -31,10 +34,17 @@ void Session::init(unsigned handle, JexMessageCallback msgCallback, const std::v
 
     const std::string dataDir = Jex_Util::findKey(m_args, "datadir");
     if (!dataDir.empty()) Jex_Util::setUserDataDirPath(dataDir);
+
+    m_deviceDB.init(); // the installation's idcode.lst; a session always has it
+
+    // The first session creates the plug-in manager (which discovers and
+    // loads the plug-ins); later sessions share it.
+    if (!m_pluginManager) m_pluginManager = new PluginManager();
 }
 
 void Session::release()
 {
+    destroyTarget(0); // closes it while the host can still hear of it
     m_msgCallback = nullptr;
     m_handle = 0;
     m_args.clear();
@@ -70,10 +80,22 @@ void Session::setPluginSearchPath(const std::string& path)
     refreshTargetList();
 }
 
-// Until plug-in management exists the target list is empty.
-unsigned Session::refreshTargetList() { return JEX_FAILURE; }
-unsigned Session::getTargetCount() { return 0; }
-unsigned Session::getTargetXMLSizeByIndex(unsigned) { return 0; }
-unsigned Session::getTargetByIndex(unsigned, char*, unsigned, std::string*, std::string*) { return JEX_FAILURE; }
+// The target list belongs to the plug-in manager; a live session always
+// has one, the checks only keep a misuse from crashing.
+unsigned Session::refreshTargetList() { return m_pluginManager ? m_pluginManager->refreshTargetList() : JEX_FAILURE; }
+
+unsigned Session::getTargetCount() { return m_pluginManager ? m_pluginManager->getTargetCount() : 0; }
+
+unsigned Session::getTargetXMLSizeByIndex(unsigned index)
+{
+    return m_pluginManager ? m_pluginManager->getXMLSizeByIndex(index) : 0;
+}
+
+unsigned Session::getTargetByIndex(unsigned index, char* xmlBuf, unsigned xmlBufLen, std::string* targetName,
+                                   std::string* pluginName)
+{
+    if (!m_pluginManager) return JEX_FAILURE;
+    return m_pluginManager->getTargetByIndex(index, xmlBuf, xmlBufLen, targetName, pluginName);
+}
 
 } // namespace JexRT

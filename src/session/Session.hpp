@@ -4,15 +4,20 @@
 // the session-level operations every other layer uses.  Only the registry
 // constructs and destroys sessions.
 
+#include <istream>
 #include <memory>
 #include <string>
 #include <vector>
 
+#include "jexjtag/rt/DeviceDB.hpp"
+#include "jexjtag/rt/IDCode.hpp"
 #include "jexjtag/types.h"
 
 namespace JexRT {
 
 class InternalSessionMessageListener;
+class PluginManager;
+class Target;
 
 class Session final {
 public:
@@ -37,6 +42,14 @@ public:
     virtual const char* getClassName() const { return "Session"; }
     virtual unsigned getHandle() const { return m_handle; }
 
+    // The target slot (only index 0 exists).  getTarget: the target or
+    // null.  createTarget: destroys the old target first, then stores and
+    // returns a new one (null for another index or when it cannot be
+    // made).  destroyTarget: deletes the target, which closes it.
+    virtual Target* getTarget(unsigned index) const;
+    virtual Target* createTarget(unsigned index);
+    virtual void destroyTarget(unsigned index);
+
     // Delivers a message to the host: its callback, or else standard output
     // with the type's prefix ("Error:", "Warning:", "Status:", "Info:").
     virtual void sendMessage(unsigned msgType, const std::string& text);
@@ -52,6 +65,14 @@ public:
     virtual unsigned getTargetByIndex(unsigned index, char* xmlBuf, unsigned xmlBufLen, std::string* targetName,
                                       std::string* pluginName);
 
+    // Reads a caller's IDCODE list from in into the device database, as user
+    // entries.  JEX_FAILURE when anything goes wrong (a bad line: the
+    // entries before it stay).
+    virtual unsigned addDeviceData(const std::string& name, std::istream& in);
+    // Looks idcode up in the device database (see SessionDevices.cpp).
+    virtual unsigned idcodeLookup(const IDCode& idcode, std::string& deviceName, unsigned* irLength,
+                                  unsigned* familyType, unsigned* familySubType, std::string& bypass,
+                                  bool* isUserList);
     // The same for a BSDL text in memory: it is written to a temporary file
     // named after the base name of `filename` in the per-user ".lumenfold"
     // directory, read from there, and the file is removed again.
@@ -61,12 +82,19 @@ public:
 
     const std::vector<std::string>& getArguments() const { return m_args; }
 
+    // The one plug-in manager of the process: created by the first
+    // session's init, deleted by the registry after the last session
+    // (unless "unloadtargetsondestroy=false").  Null while none exists.
+    static PluginManager* m_pluginManager;
+
 private:
     unsigned m_handle = 0;
+    Target* m_target = nullptr; // owned; index 0
     JexMessageCallback m_msgCallback = nullptr;
     std::vector<std::string> m_args;
     std::string m_pluginSearchPath;
     std::unique_ptr<InternalSessionMessageListener> m_messageListener;
+    DeviceDB m_deviceDB;
 };
 
 } // namespace JexRT

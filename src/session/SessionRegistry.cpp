@@ -4,6 +4,7 @@
 #include <array>
 #include <new>
 
+#include "plugin/PluginManager.hpp"
 #include "session/Session.hpp"
 #include "util/Jex_Util.hpp"
 #include "util/Logger.hpp"
@@ -40,10 +41,8 @@ Session* findSession(unsigned handle) { return registry().sessions[slotOf(handle
 
 Target* findTarget(unsigned handle)
 {
-    Session* session = findSession(handle);
-    if (!session) return nullptr;
-    (void)(handle & JEX_HANDLE_TARGET_MASK);
-    return nullptr; // sessions hold no target object yet
+    const Session* session = findSession(handle);
+    return session ? session->getTarget(handle & JEX_HANDLE_TARGET_MASK) : nullptr;
 }
 
 bool noLiveSessions() { return registry().liveCount == 0; }
@@ -114,6 +113,12 @@ unsigned destroySession(unsigned handle)
 
     const std::vector<SessionMessageListener*> listeners = r.listeners;
     for (SessionMessageListener* listener : listeners) listener->sessionDestroyed(handle);
+
+    // The last session takes the plug-in manager, and every module with it.
+    if (r.liveCount == 0 && r.unloadOnLastDestroy) {
+        delete Session::m_pluginManager;
+        Session::m_pluginManager = nullptr;
+    }
     return JEX_SUCCESS;
 }
 

@@ -2,6 +2,7 @@
 
 #include <cstdlib>
 #include <cstring>
+#include <vector>
 
 #include "platform/Process.hpp"
 
@@ -30,6 +31,7 @@ void Logger::openSink(const std::string& path)
 {
     if (m_file) std::fclose(m_file);
     m_file = nullptr;
+    m_midLine = false;
     m_path[0] = '\0';
     if (path.empty() || path.size() >= sizeof m_path) return;
     m_file = std::fopen(path.c_str(), "a");
@@ -39,8 +41,26 @@ void Logger::openSink(const std::string& path)
 void Logger::write(int level, const char* format, va_list args)
 {
     std::FILE* out = m_file ? m_file : stderr;
-    std::fprintf(out, "[jexjtag %d] ", level);
-    std::vfprintf(out, format ? format : "", args);
+    char small[512];
+    va_list again;
+    va_copy(again, args);
+    const int length = std::vsnprintf(small, sizeof small, format ? format : "", args);
+    if (length < 0) {
+        va_end(again);
+        return;
+    }
+    std::vector<char> large;
+    const char* text = small;
+    if (static_cast<size_t>(length) >= sizeof small) {
+        large.resize(static_cast<size_t>(length) + 1);
+        std::vsnprintf(large.data(), large.size(), format ? format : "", again);
+        text = large.data();
+    }
+    va_end(again);
+    if (length == 0) return;
+    if (!m_midLine) std::fprintf(out, "[jexjtag %d] ", level);
+    std::fwrite(text, 1, static_cast<size_t>(length), out);
+    m_midLine = text[length - 1] != '\n';
     std::fflush(out);
 }
 
@@ -48,6 +68,8 @@ void Logger::dumpBuffer(int level, const char* title, const unsigned char* bytes
 {
     if (!isEnabled(level)) return;
     std::FILE* out = m_file ? m_file : stderr;
+    if (m_midLine) std::fputc('\n', out);
+    m_midLine = false;
     std::fprintf(out, "[jexjtag %d] %s (%u bits)\n", level, title ? title : "", bitLength);
     if (!bytes) {
         std::fprintf(out, "[jexjtag %d]   NULL\n", level);

@@ -6,7 +6,8 @@
 // JEXJTAG_LOG_LEVEL chooses the highest level written (0, the default,
 // writes nothing); JEXJTAG_LOG_FILE names a file to append to (default:
 // standard error).  Each line is the caller's formatted text, after a short
-// prefix "[jexjtag N] " that names its level.  A level that is not enabled
+// prefix "[jexjtag N] " that names its level; a line written in several
+// calls (the first ones without a line end) gets one prefix.  A level that is not enabled
 // costs one comparison: nothing is formatted or allocated.
 
 #include <cstdarg>
@@ -56,6 +57,9 @@ private:
     void openSink(const std::string& path);
 
     int m_level = 0;
+    // True after a write that did not end its line: the next write goes on
+    // that line, without a prefix of its own.
+    bool m_midLine = false;
     std::FILE* m_file = nullptr; // null: standard error
     char m_path[4096] = {};
 };

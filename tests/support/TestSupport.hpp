@@ -146,25 +146,35 @@ private:
     ScopedEnv m_file;
 };
 
-// Points the library at an empty plug-in tree and a private home directory
-// for the scope, so a test sees only what it sets up.
+// Points the library at an empty plug-in tree, a private home directory and
+// a private data directory (holding a copy of the build's idcode.lst) for
+// the scope, so a test sees only what it sets up.
 class IsolatedEnvironment {
 public:
     IsolatedEnvironment()
         : m_plugins("JEXJTAG_PLUGIN_DIR", (m_root / "plugins").string()),
-          m_home("HOME", (m_root / "home").string())
+          m_home("HOME", (m_root / "home").string()),
+          m_data("JEXJTAG_DATA_DIR", (m_root / "data").string())
     {
         std::filesystem::create_directories(m_root / "plugins");
         std::filesystem::create_directories(m_root / "home");
+        std::filesystem::create_directories(m_root / "data");
+#ifdef JEXJTAG_TEST_BUILD_DIR
+        std::filesystem::copy_file(std::filesystem::path(JEXJTAG_TEST_BUILD_DIR) / "share/jexjtag/idcode.lst",
+                                   m_root / "data/idcode.lst");
+#endif
     }
     const TempDir& root() const { return m_root; }
     std::filesystem::path pluginRoot() const { return m_root / "plugins"; }
     std::filesystem::path home() const { return m_root / "home"; }
+    // The default data directory (JEXJTAG_DATA_DIR) of the scope.
+    std::filesystem::path dataDir() const { return m_root / "data"; }
 
 private:
     TempDir m_root;
     ScopedEnv m_plugins;
     ScopedEnv m_home;
+    ScopedEnv m_data;
 };
 
 } // namespace testsupport

@@ -1,0 +1,63 @@
+#include "SimChain.hpp"
+
+namespace jexsim {
+
+SimChain::SimChain(const std::vector<DeviceSpec>& devices)
+{
+    m_devices.reserve(devices.size());
+    for (const DeviceSpec& spec : devices) m_devices.emplace_back(spec);
+}
+
+bool SimChain::clock(bool tms, bool tdi)
+{
+    const bool out = tdo(tdi);
+    // Every device samples its neighbour's TDO as it was before this edge:
+    // clock from TDO towards TDI, so the neighbour has not moved yet.
+    const std::size_t n = m_devices.size();
+    for (std::size_t k = 0; k < n; ++k) {
+        const bool in = k + 1 < n ? m_devices[k + 1].tdo() : tdi;
+        m_devices[k].clock(tms, in);
+    }
+    ++m_cycles;
+    m_lastTms = tms;
+    m_lastTdi = tdi;
+    if (m_observer) m_observer->onClock(*this, tms, tdi, out);
+    return out;
+}
+
+bool SimChain::inShiftState() const
+{
+    for (const SimDevice& d : m_devices)
+        if (d.state() != JEXJTAG_SHIFT_DR && d.state() != JEXJTAG_SHIFT_IR) return false;
+    return true;
+}
+
+void SimChain::shift(const jexcable::ShiftSource& in, jexcable::ShiftSink& out, uint32_t count, bool tmsOnLast)
+{
+    if (count == 0) return;
+    if (m_observer || !inShiftState()) {
+        JtagTransport::shift(in, out, count, tmsOnLast);
+        return;
+    }
+    const std::size_t n = m_devices.size();
+    SimDevice* const devices = m_devices.data();
+    uint64_t lastWord = 0;
+    unsigned lastBits = 0;
+    for (uint64_t done = 0; done < count;) {
+        const unsigned bits = count - done >= 64 ? 64u : static_cast<unsigned>(count - done);
+        uint64_t word = in.word(done, bits);
+        lastWord = word;
+        lastBits = bits;
+        // The word enters at TDI (the last device) and leaves at device 0.
+        for (std::size_t k = n; k-- > 0;) word = devices[k].shiftWord(word, bits);
+        out.put(done, bits, word);
+        done += bits;
+    }
+    if (tmsOnLast)
+        for (std::size_t k = 0; k < n; ++k) devices[k].step(true);
+    m_cycles += count;
+    m_lastTms = tmsOnLast;
+    m_lastTdi = ((lastWord >> (lastBits - 1)) & 1u) != 0;
+}
+
+} // namespace jexsim

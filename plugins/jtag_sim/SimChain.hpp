@@ -1,0 +1,51 @@
+#pragma once
+// A simulated scan chain: TDI enters the last device, each device's TDO
+// feeds the device before it, and device 0's TDO is the chain's TDO (device
+// 0 is nearest TDO; its IDCODE leaves first in a DR scan after reset).  A
+// chain of no devices is a wire from TDI to TDO.
+//
+// It is the cable's transport: clock() is one TCK cycle, shift() a run of
+// cycles in a Shift state, which it moves 64 bits at a time through every
+// device unless an observer wants to see each clock.
+
+#include <cstdint>
+#include <vector>
+
+#include "ChainObserver.hpp"
+#include "DeviceSpec.hpp"
+#include "JtagTransport.hpp"
+#include "SimDevice.hpp"
+
+namespace jexsim {
+
+class SimChain : public jexcable::JtagTransport {
+public:
+    explicit SimChain(const std::vector<DeviceSpec>& devices);
+
+    std::size_t size() const { return m_devices.size(); }
+    const SimDevice& device(std::size_t index) const { return m_devices[index]; }
+    // The level on the chain's TDO now, with TDI at `tdi` (matters only for
+    // a chain of no devices).
+    bool tdo(bool tdi) const { return m_devices.empty() ? tdi : m_devices.front().tdo(); }
+    // TCK cycles so far.
+    uint64_t cycles() const { return m_cycles; }
+    bool lastTms() const { return m_lastTms; }
+    bool lastTdi() const { return m_lastTdi; }
+
+    // Clocks are reported to the observer (none: null); not owned.
+    void setObserver(ChainObserver* observer) { m_observer = observer; }
+
+    bool clock(bool tms, bool tdi) override;
+    void shift(const jexcable::ShiftSource& in, jexcable::ShiftSink& out, uint32_t count, bool tmsOnLast) override;
+
+private:
+    bool inShiftState() const;
+
+    std::vector<SimDevice> m_devices;
+    ChainObserver* m_observer = nullptr;
+    uint64_t m_cycles = 0;
+    bool m_lastTms = true;
+    bool m_lastTdi = true;
+};
+
+} // namespace jexsim

@@ -1,0 +1,133 @@
+#include "SimOptions.hpp"
+
+#include "ChainSpec.hpp"
+
+namespace jexsim {
+
+using jexcable::PluginArgs;
+
+std::vector<DeviceSpec> SimOptions::defaultChain()
+{
+    DeviceSpec dap;
+    dap.idcode = 0x4BA00477;
+    dap.irLength = 4;
+    dap.idcodeOpcode = 0xE;
+    dap.userOpcode = 0xA; // DPACC
+    dap.userBits = 35;
+
+    DeviceSpec artix;
+    artix.idcode = 0x0362D093;
+    artix.irLength = 6;
+    artix.idcodeOpcode = 0x09;
+    artix.userOpcode = 0x02; // USER1
+
+    DeviceSpec ecp5;
+    ecp5.idcode = 0x41111043;
+    ecp5.irLength = 8;
+    ecp5.idcodeOpcode = 0xE0;
+    ecp5.userOpcode = 0x32; // ER1
+
+    return {dap, artix, ecp5};
+}
+
+bool SimOptions::parseFrequency(const std::string& text, uint64_t& hz)
+{
+    std::string digits = PluginArgs::trim(text);
+    uint64_t scale = 1;
+    if (!digits.empty()) {
+        const char last = digits.back();
+        if (last == 'k' || last == 'K') scale = 1000;
+        else if (last == 'M') scale = 1000000;
+        if (scale != 1) digits.pop_back();
+    }
+    if (digits.empty() || digits.size() > 10) return false;
+    uint64_t value = 0;
+    for (const char c : digits) {
+        if (c < '0' || c > '9') return false;
+        value = value * 10 + static_cast<uint64_t>(c - '0');
+    }
+    value *= scale;
+    if (value == 0 || value > kMaxFrequency) return false;
+    hz = value;
+    return true;
+}
+
+bool SimOptions::parseFlag(const std::string& text, bool& flag)
+{
+    const std::string t = PluginArgs::toLower(PluginArgs::trim(text));
+    if (t == "1" || t == "true" || t == "yes" || t == "on") flag = true;
+    else if (t == "0" || t == "false" || t == "no" || t == "off") flag = false;
+    else return false;
+    return true;
+}
+
+bool SimOptions::set(const std::string& rawKey, const std::string& value, std::string& error)
+{
+    const std::string key = PluginArgs::toLower(PluginArgs::trim(rawKey));
+    if (key == "chain") {
+        std::vector<DeviceSpec> devices;
+        if (!ChainSpec::parse(value, devices, error)) {
+            error = "chain: " + error;
+            return false;
+        }
+        chain = std::move(devices);
+    } else if (key == "port") {
+        const std::string p = PluginArgs::trim(value);
+        if (p.empty()) {
+            error = "port: empty port name";
+            return false;
+        }
+        port = p;
+    } else if (key == "frequency") {
+        uint64_t hz = 0;
+        if (!parseFrequency(value, hz)) {
+            error = "frequency: \"" + value + "\" is not a frequency of 1 Hz to 1000M";
+            return false;
+        }
+        frequencyHz = hz;
+    } else if (key == "vcd") {
+        vcdPath = PluginArgs::trim(value);
+    } else if (key == "new_firmware") {
+        bool flag = false;
+        if (!parseFlag(value, flag)) {
+            error = "new_firmware: \"" + value + "\" is not 0 or 1";
+            return false;
+        }
+        newFirmware = flag;
+    } else {
+        error = "unknown option \"" + rawKey + "\" (chain, port, frequency, vcd, new_firmware)";
+        return false;
+    }
+    return true;
+}
+
+bool SimOptions::get(const std::string& rawKey, std::string& value) const
+{
+    const std::string key = PluginArgs::toLower(PluginArgs::trim(rawKey));
+    if (key == "chain") value = ChainSpec::format(chain);
+    else if (key == "port") value = port;
+    else if (key == "frequency") value = std::to_string(frequencyHz);
+    else if (key == "vcd") value = vcdPath;
+    else if (key == "new_firmware") value = newFirmware ? "1" : "0";
+    else return false;
+    return true;
+}
+
+bool SimOptions::apply(const PluginArgs& args, std::string& error, std::vector<std::string>* ignored)
+{
+    static const char* const known[] = {"chain", "port", "frequency", "vcd", "new_firmware"};
+    SimOptions updated = *this;
+    for (const auto& [key, value] : args.entries()) {
+        bool isKnown = false;
+        for (const char* k : known) isKnown = isKnown || PluginArgs::equalsIgnoreCase(key, k);
+        if (!isKnown) {
+            if (ignored) ignored->push_back(key);
+            continue;
+        }
+        if (!updated.set(key, value, error)) return false;
+    }
+    *this = std::move(updated);
+    return true;
+}
+
+} // namespace jexsim

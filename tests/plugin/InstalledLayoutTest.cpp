@@ -1,0 +1,104 @@
+// A plug-in written in C against plugin.h alone, dropped into
+// plugins/<company>/<name>/ beside an installed copy of libJexJtag.so, is
+// found without any setting: the plug-in root is the library's directory.
+
+#include <gtest/gtest.h>
+
+#include <cstdlib>
+#include <filesystem>
+#include <string>
+
+#include "PluginTree.hpp"
+#include "jexjtag/session.h"
+#include "platform/DynamicLibrary.hpp"
+#include "support/TestSupport.hpp"
+
+// Libraries that stay loaded until the process ends (reachable, so no leak).
+jexplatform::DynamicLibrary* g_keptLoaded = nullptr;
+
+namespace {
+
+namespace fs = std::filesystem;
+
+// Unsets an environment variable for the scope.
+class ScopedUnset {
+public:
+    explicit ScopedUnset(const char* name) : m_name(name)
+    {
+        if (const char* old = std::getenv(name)) {
+            m_had = true;
+            m_old = old;
+        }
+        unsetenv(name);
+    }
+    ~ScopedUnset()
+    {
+        if (m_had) setenv(m_name.c_str(), m_old.c_str(), 1);
+    }
+
+private:
+    std::string m_name;
+    std::string m_old;
+    bool m_had = false;
+};
+
+template <typename Fn>
+Fn need(const jexplatform::DynamicLibrary& lib, const char* name)
+{
+    Fn fn = lib.symbol<Fn>(name);
+    if (!fn) ADD_FAILURE() << name << " is not exported";
+    return fn;
+}
+
+TEST(InstalledLayout, ACPluginBesideTheLibraryIsListedWithItsDescriptor)
+{
+    testsupport::TempDir prefix;
+    testsupport::ScopedEnv home("HOME", prefix.str());
+    ScopedUnset pluginDir("JEXJTAG_PLUGIN_DIR");
+
+    // <prefix>/lib/libJexJtag.so and <prefix>/lib/plugins/example/loopback/.
+    const fs::path lib = prefix / "lib";
+    fs::create_directories(lib);
+    fs::copy_file(fs::canonical(fs::path(JEXJTAG_TEST_BUILD_DIR) / "lib" / "libJexJtag.so"), lib / "libJexJtag.so");
+    testsupport::PluginTree tree(lib / "plugins");
+    const std::string descriptor = "<?xml version=\"1.0\"?>\n"
+                                   "<JexPlugin>\n"
+                                   "  <description>Loopback cable written in C</description>\n"
+                                   "  <targetname>loopback_cable</targetname>\n"
+                                   "</JexPlugin>\n";
+    tree.addModule("example", "loopback", "test_loopback_c");
+    tree.addDescriptor("example", "loopback", descriptor);
+
+    // Its own copy of the library, with its own process-wide state.
+    jexplatform::DynamicLibrary jexjtag = jexplatform::DynamicLibrary::load((lib / "libJexJtag.so").string());
+    ASSERT_TRUE(jexjtag.isLoaded()) << jexjtag.error();
+    auto create = need<decltype(&JexJtag_session_create)>(jexjtag, "JexJtag_session_create");
+    auto destroy = need<decltype(&JexJtag_session_destroy)>(jexjtag, "JexJtag_session_destroy");
+    auto getCount = need<decltype(&JexJtag_session_getTargetCount)>(jexjtag, "JexJtag_session_getTargetCount");
+    auto getSize =
+        need<decltype(&JexJtag_session_getTargetXMLSizeByIndex)>(jexjtag, "JexJtag_session_getTargetXMLSizeByIndex");
+    auto getTarget = need<decltype(&JexJtag_session_getTargetByIndex)>(jexjtag, "JexJtag_session_getTargetByIndex");
+    ASSERT_TRUE(create && destroy && getCount && getSize && getTarget);
+
+    unsigned h = 0;
+    ASSERT_EQ(JEX_SUCCESS, create(nullptr, 0, nullptr, &h));
+    unsigned count = 0;
+    ASSERT_EQ(JEX_SUCCESS, getCount(h, &count));
+    ASSERT_EQ(1u, count);
+    unsigned size = 0;
+    ASSERT_EQ(JEX_SUCCESS, getSize(h, 0, &size));
+    ASSERT_EQ(descriptor.size() + 1, size);
+    std::string xml(size, 'x');
+    char name[64], plugin[64];
+    ASSERT_EQ(JEX_SUCCESS, getTarget(h, 0, xml.data(), size, name, sizeof name, plugin, sizeof plugin));
+    EXPECT_EQ(descriptor, std::string(xml.c_str()));
+    EXPECT_STREQ("loopback_cable", name);
+    EXPECT_STREQ("loopback", plugin);
+    EXPECT_EQ(JEX_SUCCESS, destroy(h));
+
+    // The copy stays loaded until the process ends: its process-wide message
+    // manager lives as long as the library does.
+    g_keptLoaded = new jexplatform::DynamicLibrary(std::move(jexjtag));
+}
+
+} // namespace
