@@ -239,6 +239,9 @@ TEST_F(CliProgramTest, ShiftTheWholeChain)
     RunResult r = run({"shift", "dr", "--bits", "96"});
     EXPECT_EQ(0, r.exitCode) << r.err;
     EXPECT_EQ("0x411110430362D0934BA00477\n", r.out);
+    // Written data comes out behind them: 4 bits written, the first 4 read.
+    r = run({"shift", "dr", "0b1010"});
+    EXPECT_EQ("0b0111\n", r.out);
 
     // The chain's IR (4 + 6 + 8 bits) captures ...01 in each device.
     r = run({"shift", "ir", "--bits", "18", "0x3FFFF", "--exit", "pause-ir"});
@@ -255,7 +258,12 @@ TEST_F(CliProgramTest, ShiftRefusesWhatDoesNotFitTheDevice)
     EXPECT_EQ("jexjtag: there is no device 3: the chain has 3 devices\n", r.err);
     r = run({"shift", "ir", "--device", "1", "0b101"});
     EXPECT_EQ(1, r.exitCode);
-    EXPECT_EQ("jexjtag: device 1 has an IR length of 6, but 3 bits were given\n", r.err);
+    EXPECT_EQ("jexjtag: device 1 has an IR length of 6, but 0b101 has 3 bits\n", r.err);
+    r = run({"shift", "ir", "--device", "1", "--bits", "8", "0x09"});
+    EXPECT_EQ("jexjtag: device 1 has an IR length of 6, but 0x09 has 8 bits\n", r.err);
+    r = run({"shift", "dr", "--device", "1", "--ir", "0b111", "0x0"});
+    EXPECT_EQ(1, r.exitCode);
+    EXPECT_EQ("jexjtag: device 1 has an IR length of 6, but 0b111 has 3 bits\n", r.err);
     r = run({"shift", "ir", "--device", "1", "0xFF"});
     EXPECT_EQ(1, r.exitCode);
     EXPECT_EQ("jexjtag: data 0xFF does not fit into the 6-bit instruction register of device 1\n", r.err);

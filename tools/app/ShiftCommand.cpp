@@ -39,7 +39,7 @@ void fitToInstructionRegister(DataValue& data, const std::string& text, bool len
         }
     }
     throw CliError("device " + std::to_string(device) + " has an IR length of " + std::to_string(irLength) + ", but " +
-                   std::to_string(data.bits.size()) + " bits were given");
+                   text + " has " + std::to_string(data.bits.size()) + " bits");
 }
 
 // One shift; TDO comes back.  With tdi not written (read only) TDI stays 0.
