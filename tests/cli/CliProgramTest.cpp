@@ -239,7 +239,7 @@ TEST_F(CliProgramTest, ShiftTheWholeChain)
     RunResult r = run({"shift", "dr", "--bits", "96"});
     EXPECT_EQ(0, r.exitCode) << r.err;
     EXPECT_EQ("0x411110430362D0934BA00477\n", r.out);
-    // Written data comes out behind them: 4 bits written, the first 4 read.
+    // Four bits written: TDO holds the first four bits of device 0's IDCODE.
     r = run({"shift", "dr", "0b1010"});
     EXPECT_EQ("0b0111\n", r.out);
 
