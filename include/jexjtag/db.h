@@ -11,19 +11,26 @@
 
 JEXJTAG_BEGIN_DECLS
 
-/* Adds an IDCODE list held in buf (bufsize bytes) to the session's database;
- * its entries win over the installation's for the same pattern.  filename
- * only labels messages.  A bad line fails; the lines before it stay. */
+/* Adds an IDCODE list held in buf (bufsize bytes, embedded NUL bytes
+ * included) to the session's database; its entries win over the
+ * installation's for the same pattern.  filename only labels messages and
+ * must not be null; buf may be null only when bufsize is 0.  A bad line
+ * fails; the lines before it stay. */
 JEXJTAG_API uint32_t JexJtag_db_addDeviceData(unsigned handle, const char* filename, const char* buf,
                                               unsigned bufsize);
 
 /* Looks an IDCODE up.  A code nobody knows succeeds with an empty name, IR
- * length 0 and an empty BYPASS text.  Texts are cut to their buffer size - 1
- * and NUL-terminated.  On failure the name buffer is zeroed, *irlen is 0 and
- * the BYPASS buffer is filled with 0xFF bytes.  irlen must not be null. */
+ * length 0 and an empty BYPASS text.  The BYPASS text is one '1' per bit of
+ * the IR length.  Texts are copied into their buffer, padded with NUL bytes
+ * and cut to the buffer size - 1.  On failure (unknown handle, null idcode,
+ * a given buffer of size 0) the name buffer is zeroed, *irlen is 0 and the
+ * BYPASS buffer is filled with 0xFF bytes (no NUL).  Null outputs are
+ * skipped. */
 JEXJTAG_API uint32_t JexJtag_db_lookupDevice(unsigned handle, const char* idcode, char* deviceName,
                                              unsigned devicebuf_size, unsigned* irlen, char* cmd_bypass,
                                              unsigned bypassbuf_size);
+/* The three lookups below call JexJtag_db_lookupDevice for one output each,
+ * with the same buffer rules and statuses. */
 JEXJTAG_API uint32_t JexJtag_db_getDeviceNameForIdcode(unsigned handle, const char* idcode,
                                                        char* deviceName, unsigned devicebuf_size);
 JEXJTAG_API uint32_t JexJtag_db_getIRLengthForIdcode(unsigned handle, const char* idcode, unsigned* irlen);

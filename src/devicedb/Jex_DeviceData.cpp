@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <climits>
+#include <cstddef>
 #include <cstdint>
 #include <fstream>
 #include <ostream>
@@ -112,10 +113,16 @@ bool Jex_DeviceData::entryCompare(const Jex_OneDeviceData* a, const Jex_OneDevic
 
 void Jex_DeviceData::sortEntries()
 {
-    std::sort(m_entries.begin(), m_entries.end(),
-              [](const std::unique_ptr<Jex_OneDeviceData>& a, const std::unique_ptr<Jex_OneDeviceData>& b) {
-                  return entryCompare(a.get(), b.get());
-              });
+    // The entries up to m_sortedCount are in order already: sort only what
+    // came after them and merge the two runs, so adding a short list to a
+    // long table costs little more than one pass over the table.
+    const auto less = [](const std::unique_ptr<Jex_OneDeviceData>& a, const std::unique_ptr<Jex_OneDeviceData>& b) {
+        return entryCompare(a.get(), b.get());
+    };
+    const auto middle = m_entries.begin() + static_cast<std::ptrdiff_t>(m_sortedCount);
+    std::sort(middle, m_entries.end(), less);
+    std::inplace_merge(m_entries.begin(), middle, m_entries.end(), less);
+    m_sortedCount = m_entries.size();
 }
 
 void Jex_DeviceData::addEntriesFromFile(const char* fileName, std::istream& in, bool userEntry)
@@ -175,7 +182,11 @@ void Jex_DeviceData::getFamilyTypeByIdcode(int code, int* familyType, int* subTy
     if (subType) *subType = entry ? entry->getSubType() : 0;
 }
 
-void Jex_DeviceData::resetEntries() { m_entries.clear(); }
+void Jex_DeviceData::resetEntries()
+{
+    m_entries.clear();
+    m_sortedCount = 0;
+}
 
 std::ostream& operator<<(std::ostream& out, const Jex_DeviceData& table)
 {

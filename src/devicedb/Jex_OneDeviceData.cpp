@@ -34,12 +34,6 @@ Jex_OneDeviceData::Jex_OneDeviceData(const std::string& pattern, const std::stri
     mfg = static_cast<int>(bits & 0xFFFu);
 }
 
-bool Jex_OneDeviceData::isMatch(int code) const
-{
-    const unsigned int mask = static_cast<unsigned int>(nonXMask);
-    return (mask & static_cast<unsigned int>(code)) == (static_cast<unsigned int>(idcode) & mask);
-}
-
 std::string Jex_OneDeviceData::intIdcodeToString(int code)
 {
     const unsigned int value = static_cast<unsigned int>(code);

@@ -69,7 +69,10 @@ public:
     // entries.  JEX_FAILURE when anything goes wrong (a bad line: the
     // entries before it stay).
     virtual unsigned addDeviceData(const std::string& name, std::istream& in);
-    // Looks idcode up in the device database (see SessionDevices.cpp).
+    // Looks idcode up in the device database: the name, and each number and
+    // the user-list flag whose pointer is given; bypass becomes one '1' per
+    // bit of the IR length ("" when irLength is null).  A code no entry
+    // matches succeeds with "", zeros, false and bypass untouched.
     virtual unsigned idcodeLookup(const IDCode& idcode, std::string& deviceName, unsigned* irLength,
                                   unsigned* familyType, unsigned* familySubType, std::string& bypass,
                                   bool* isUserList);

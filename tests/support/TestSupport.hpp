@@ -154,21 +154,21 @@ public:
     IsolatedEnvironment()
         : m_plugins("JEXJTAG_PLUGIN_DIR", (m_root / "plugins").string()),
           m_home("HOME", (m_root / "home").string()),
-          m_data("JEXJTAG_DATA_DIR", (m_root / "data").string())
+          m_data("JEXJTAG_DATA_DIR", (m_root / "share/jexjtag").string())
     {
         std::filesystem::create_directories(m_root / "plugins");
         std::filesystem::create_directories(m_root / "home");
-        std::filesystem::create_directories(m_root / "data");
+        std::filesystem::create_directories(dataDir());
 #ifdef JEXJTAG_TEST_BUILD_DIR
         std::filesystem::copy_file(std::filesystem::path(JEXJTAG_TEST_BUILD_DIR) / "share/jexjtag/idcode.lst",
-                                   m_root / "data/idcode.lst");
+                                   dataDir() / "idcode.lst");
 #endif
     }
     const TempDir& root() const { return m_root; }
     std::filesystem::path pluginRoot() const { return m_root / "plugins"; }
     std::filesystem::path home() const { return m_root / "home"; }
     // The default data directory (JEXJTAG_DATA_DIR) of the scope.
-    std::filesystem::path dataDir() const { return m_root / "data"; }
+    std::filesystem::path dataDir() const { return m_root / "share/jexjtag"; }
 
 private:
     TempDir m_root;

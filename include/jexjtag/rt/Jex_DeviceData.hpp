@@ -21,6 +21,7 @@
 // character in sub type." or "bad data.".  Entries of the lines before a
 // bad line stay in the table.
 
+#include <cstddef>
 #include <iosfwd>
 #include <memory>
 #include <string>
@@ -77,6 +78,7 @@ private:
     void sortEntries();
 
     std::vector<std::unique_ptr<Jex_OneDeviceData>> m_entries;
+    size_t m_sortedCount = 0; // leading entries known to be in order
 };
 
 // Diagnostic form of the table: "Entry <index>:" (decimal), the entry's

@@ -41,7 +41,11 @@ public:
     unsigned int getMfg() const { return static_cast<unsigned int>(mfg); }
 
     // True when code has the pattern's bit on every '0'/'1' position.
-    bool isMatch(int code) const;
+    bool isMatch(int code) const
+    {
+        const unsigned int mask = static_cast<unsigned int>(nonXMask);
+        return (mask & static_cast<unsigned int>(code)) == (static_cast<unsigned int>(idcode) & mask);
+    }
     // 32 characters '0'/'1', bit 31 first.
     static std::string intIdcodeToString(int code);
 

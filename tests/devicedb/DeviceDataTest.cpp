@@ -1,0 +1,325 @@
+// IDCODE list lines, the entry table's order and lookups, named files with
+// their .acd data file.
+
+#include <gtest/gtest.h>
+
+#include <sstream>
+#include <stdexcept>
+#include <string>
+#include <type_traits>
+#include <utility>
+#include <vector>
+
+#include "jexjtag/rt/Jex_DeviceData.hpp"
+#include "support/TestSupport.hpp"
+
+using JexRT::Jex_DeviceData;
+using JexRT::Jex_OneDeviceData;
+using testsupport::TempDir;
+using testsupport::writeFile;
+
+namespace {
+
+const std::string kDevA = "0000_1010_0000_0000_0001_0000_1001_0011"; // 0x0A001093
+const std::string P = "00001010000000000001000010010011";           // the same without '_'
+
+void read(Jex_DeviceData& table, const std::string& text, bool user = false, const char* name = "test.lst")
+{
+    std::istringstream in(text);
+    table.addEntriesFromFile(name, in, user);
+}
+
+// The message of the error that reading text throws, or "" when it reads.
+std::string errorOf(const std::string& text, Jex_DeviceData* into = nullptr)
+{
+    Jex_DeviceData local;
+    try {
+        read(into ? *into : local, text);
+    } catch (const std::logic_error& e) {
+        return e.what();
+    }
+    return "";
+}
+
+std::string lineError(int line, const std::string& reason)
+{
+    return "Input error in file: test.lst line:" + std::to_string(line) + " - " + reason;
+}
+
+} // namespace
+
+static_assert(!std::is_copy_constructible_v<Jex_DeviceData> && !std::is_copy_assignable_v<Jex_DeviceData>,
+              "a table owns its entries");
+
+TEST(DeviceDataLines, AFullLineGivesOneEntry)
+{
+    Jex_DeviceData table;
+    read(table, kDevA + " 6 1 2 DEVA\n");
+    ASSERT_EQ(1u, table.getEntryCount());
+    const Jex_OneDeviceData& e = table.getEntry(0);
+    EXPECT_EQ(P, e.getMatchText());
+    EXPECT_EQ(6, e.getIRLength());
+    EXPECT_EQ(1, e.getFamilyType());
+    EXPECT_EQ(2, e.getSubType());
+    EXPECT_EQ("DEVA", e.getName());
+    EXPECT_FALSE(e.isUserEntry());
+    EXPECT_EQ(0xFFFFFFFFu, e.getNonXMask());
+    EXPECT_EQ(0x0A001093u, e.getIdcode());
+    EXPECT_EQ(0x093u, e.getMfg());
+    EXPECT_TRUE(e.isMatch(0x0A001093));
+    EXPECT_FALSE(e.isMatch(0x1A001093));
+}
+
+TEST(DeviceDataLines, DontCareBitsAndCommas)
+{
+    Jex_DeviceData table;
+    read(table, "XXXX" + kDevA.substr(4) + ",6,1,2,DEVA\n" + "xxxx" + P.substr(4) + "\t7 0 0 LOWER\n", true);
+    ASSERT_EQ(2u, table.getEntryCount());
+    const Jex_OneDeviceData& upper = table.getEntry(0);
+    EXPECT_EQ("DEVA", upper.getName());
+    EXPECT_EQ(0x0FFFFFFFu, upper.getNonXMask());
+    EXPECT_TRUE(upper.isMatch(0x0A001093));
+    EXPECT_TRUE(upper.isMatch(static_cast<int>(0xFA001093u)));
+    EXPECT_TRUE(upper.isUserEntry());
+    const Jex_OneDeviceData& lower = table.getEntry(1);
+    EXPECT_EQ("xxxx" + P.substr(4), lower.getMatchText()); // kept as written
+    EXPECT_EQ(0x0FFFFFFFu, lower.getNonXMask());
+    EXPECT_TRUE(lower.isMatch(static_cast<int>(0xFA001093u)));
+}
+
+TEST(DeviceDataLines, NameRulesAndComments)
+{
+    Jex_DeviceData table;
+    read(table, P + " 6 1 2 DEV,REV2 more words\n");
+    read(table, "0" + P.substr(1, 30) + "1 6 1 2 DEVB#note\n");
+    read(table, "1" + P.substr(1) + " 6 1 2 DEVC   # a comment\n");
+    ASSERT_EQ(3u, table.getEntryCount());
+    EXPECT_EQ("DEV,REV2", table.getEntry(0).getName());
+    EXPECT_EQ("DEVB", table.getEntry(1).getName());
+    EXPECT_EQ("DEVC", table.getEntry(2).getName());
+}
+
+TEST(DeviceDataLines, LinesWithoutData)
+{
+    Jex_DeviceData table;
+    read(table, "\n# comment\n   \t \n  # indented comment\n____\n,,,,\n\r\n");
+    EXPECT_EQ(0u, table.getEntryCount());
+}
+
+TEST(DeviceDataLines, BadLinesGiveTheirMessage)
+{
+    const std::vector<std::pair<std::string, std::string>> cases = {
+        {P.substr(1) + " 6 1 2 DEVA", "bad data."},                 // 31 characters
+        {P + "0 6 1 2 DEVA", "bad data."},                          // 33 characters
+        {P + " 6 1 2 D", "bad data."},                              // one-character name
+        {P + " 6 1", "bad data."},                                  // ends after the family type
+        {P + " 6 1 DEVA", "non-digit character in sub type."},      // sub type left out
+        {P + " 6 1 2 #note", "bad data."},                          // empty name
+        {P + " 6 1 2 # note", "bad data."},
+        {"0001#", "bad data."},                                     // '#' inside the pattern
+        {"0001 # 6 1 2 DEVA", "non-digit character in register length."},
+        {P.substr(0, 10) + "Z" + P.substr(11) + " 6 1 2 DEVA", "invalid character in idcode."},
+        {P + " 6a 1 2 DEVA", "non-digit character in register length."},
+        {P + " 6 -1 2 DEVA", "non-digit character in family type."},
+        {P + " 6 1 2x DEVA", "non-digit character in sub type."},
+        {"_ 6 1 2 DEVA", "bad data."},                              // no pattern
+        {P + " 2147483648 1 2 DEVA", "bad data."},                  // too large for the field
+        {P + " 6 99999999999999999999 2 DEVA", "bad data."},
+        {P + " 6 1 4294967296 DEVA", "bad data."},
+        // The first fault from the left decides.
+        {P.substr(1) + " 6x 1 2 D", "non-digit character in register length."},
+    };
+    for (const auto& [line, reason] : cases) EXPECT_EQ(lineError(0, reason), errorOf(line)) << line;
+}
+
+TEST(DeviceDataLines, LargestNumbersAndLeadingZeros)
+{
+    Jex_DeviceData table;
+    read(table, P + " 2147483647 007 0 BIG\n");
+    ASSERT_EQ(1u, table.getEntryCount());
+    EXPECT_EQ(2147483647, table.getEntry(0).getIRLength());
+    EXPECT_EQ(7, table.getEntry(0).getFamilyType());
+}
+
+TEST(DeviceDataLines, LinesAreNumberedFromZeroCountingEveryLine)
+{
+    EXPECT_EQ(lineError(0, "bad data."), errorOf("x\n"));
+    EXPECT_EQ(lineError(2, "bad data."), errorOf(P + " 6 1 2 DEVA\n\nx\n"));
+    EXPECT_EQ(lineError(3, "invalid character in idcode."), errorOf("# c\n\n   \nZ\n"));
+    // A last line without a line end counts.
+    EXPECT_EQ(lineError(1, "bad data."), errorOf("\n" + P + " 6 1 2"));
+}
+
+TEST(DeviceDataLines, CarriageReturnLineEndsParseLikeLineEnds)
+{
+    Jex_DeviceData table;
+    read(table, P + " 6 1 2 DEVA\r\n# c\r\n" + "1" + P.substr(1) + ",4,0,0,DEVB\r\n");
+    ASSERT_EQ(2u, table.getEntryCount());
+    EXPECT_EQ("DEVA", table.getEntry(0).getName());
+    EXPECT_EQ("DEVB", table.getEntry(1).getName());
+}
+
+TEST(DeviceDataOrder, UserEntryBeforeInstallationEntryOfTheSamePattern)
+{
+    for (bool userFirst : {true, false}) {
+        Jex_DeviceData table;
+        read(table, P + " 6 1 2 INSTALLED\n", false);
+        if (userFirst) read(table, P + " 8 3 4 MINE\n", true);
+        read(table, P + " 6 1 2 INSTALLED2\n", false);
+        if (!userFirst) read(table, P + " 8 3 4 MINE\n", true);
+        ASSERT_EQ(3u, table.getEntryCount());
+        EXPECT_TRUE(table.getEntry(0).isUserEntry());
+        EXPECT_EQ("MINE", table.getDeviceName(0x0A001093));
+        EXPECT_EQ(8, table.getIRLength(0x0A001093));
+        int family = -1, sub = -1;
+        table.getFamilyTypeByIdcode(0x0A001093, &family, &sub);
+        EXPECT_EQ(3, family);
+        EXPECT_EQ(4, sub);
+    }
+}
+
+TEST(DeviceDataOrder, ConcreteBitBeforeDontCare)
+{
+    Jex_DeviceData table;
+    // Read in the "wrong" order: the sort decides.
+    read(table, "XXXX0000" + std::string(24, '1') + " 5 0 0 SECOND\n");
+    read(table, "0000XXXX" + std::string(24, '1') + " 4 0 0 FIRST\n");
+    read(table, std::string(32, 'X') + " 2 0 0 ANY\n");
+    EXPECT_EQ("FIRST", table.getDeviceName(0x00FFFFFF)); // both match: the first wins
+    EXPECT_EQ("SECOND", table.getDeviceName(0x10FFFFFF));
+    EXPECT_EQ("ANY", table.getDeviceName(0x11111111));
+    EXPECT_EQ("ANY", table.getEntry(2).getName());
+}
+
+TEST(DeviceDataOrder, MissesGiveEmptyResults)
+{
+    Jex_DeviceData table;
+    read(table, P + " 6 1 2 DEVA\n");
+    EXPECT_EQ(nullptr, table.findByIdcode(0));
+    EXPECT_EQ("", table.getDeviceName(0));
+    EXPECT_EQ(0, table.getIRLength(0));
+    int family = -1, sub = -1;
+    table.getFamilyTypeByIdcode(0, &family, &sub);
+    EXPECT_EQ(0, family);
+    EXPECT_EQ(0, sub);
+    table.getFamilyTypeByIdcode(0, nullptr, nullptr);
+    table.resetEntries();
+    EXPECT_EQ(0u, table.getEntryCount());
+    EXPECT_EQ(nullptr, table.findByIdcode(0x0A001093));
+}
+
+TEST(DeviceDataErrors, EntriesBeforeABadLineStayAndNothingOlderIsLost)
+{
+    Jex_DeviceData table;
+    read(table, "1" + P.substr(1) + " 6 0 0 OLD\n");
+    const std::string text = "1111" + P.substr(4) + " 4 0 0 NEWB\n" + P + " 6 0 0 NEWA\n" + P + " 6 1 2 X\n";
+    EXPECT_EQ(lineError(2, "bad data."), errorOf(text, &table));
+    ASSERT_EQ(3u, table.getEntryCount());
+    // Appended behind the older entries, in reading order (not sorted yet).
+    EXPECT_EQ("OLD", table.getEntry(0).getName());
+    EXPECT_EQ("NEWB", table.getEntry(1).getName());
+    EXPECT_EQ("NEWA", table.getEntry(2).getName());
+    // The next complete read sorts them in.
+    read(table, "");
+    EXPECT_EQ("NEWA", table.getEntry(0).getName());
+    EXPECT_EQ("OLD", table.getEntry(1).getName());
+    EXPECT_EQ("NEWB", table.getEntry(2).getName());
+}
+
+TEST(DeviceDataErrors, EntryConstructorRejectsWrongPatterns)
+{
+    EXPECT_THROW(Jex_OneDeviceData("0101", "DEV", 1, 0, 0, false), std::invalid_argument);
+    EXPECT_THROW(Jex_OneDeviceData(std::string(31, '0') + "2", "DEV", 1, 0, 0, false), std::invalid_argument);
+    const Jex_OneDeviceData ok(std::string(31, 'x') + "1", "DEV", 1, 0, 0, true);
+    EXPECT_EQ(1u, ok.getNonXMask());
+    EXPECT_EQ(1u, ok.getMfg());
+    EXPECT_EQ(P, Jex_OneDeviceData::intIdcodeToString(0x0A001093));
+    EXPECT_EQ(std::string(32, '1'), Jex_OneDeviceData::intIdcodeToString(-1));
+}
+
+TEST(DeviceDataText, DiagnosticForm)
+{
+    Jex_DeviceData table;
+    read(table, P + " 6 1 2 DEVA\n" + "XXXX" + P.substr(4) + " 10 0 0 DEVB\n", true);
+    std::ostringstream out;
+    out << table << 26;
+    EXPECT_EQ("Entry 0:\n"
+              "org. match value:'" + P + "'\n"
+              "name:'DEVA' ir length:6 mfg:093 userentry:1\n"
+              "idcode  :0a001093\n"
+              "nonXMask:ffffffff\n"
+              "\n"
+              "Entry 1:\n"
+              "org. match value:'XXXX" + P.substr(4) + "'\n"
+              "name:'DEVB' ir length:10 mfg:093 userentry:1\n"
+              "idcode  :0a001093\n"
+              "nonXMask:0fffffff\n"
+              "\n26", // the stream is left as it was
+              out.str());
+}
+
+TEST(DeviceDataFiles, NamedFileAndItsDataFile)
+{
+    TempDir dir;
+    const std::string list = (dir / "chips.lst").string();
+    writeFile(list, P + " 6 1 2 FROMLIST\n");
+    writeFile(dir / "chips.acd", "# data file\nOTHER=1\nIDCODELIST=" + std::string(32, '1') + " 4 0 0 FROMACD:" +
+                                     "1" + P.substr(1) + ",5,0,0,ACD2\r\n");
+    Jex_DeviceData table;
+    table.addEntriesFromFile(list.c_str(), true);
+    ASSERT_EQ(3u, table.getEntryCount());
+    EXPECT_EQ("FROMLIST", table.getDeviceName(0x0A001093));
+    EXPECT_EQ("FROMACD", table.getDeviceName(-1));
+    EXPECT_EQ("ACD2", table.getDeviceName(static_cast<int>(0x8A001093u)));
+    EXPECT_TRUE(table.getEntry(2).isUserEntry());
+}
+
+TEST(DeviceDataFiles, ErrorsNameTheFileTheyCameFrom)
+{
+    TempDir dir;
+    const std::string missing = (dir / "none.lst").string();
+    Jex_DeviceData table;
+    try {
+        table.addEntriesFromFile(missing.c_str(), false);
+        FAIL() << "no error";
+    } catch (const std::logic_error& e) {
+        EXPECT_EQ("Error: Unable to open " + missing, e.what());
+    }
+    EXPECT_THROW(table.addEntriesFromFile(dir.str().c_str(), false), std::logic_error); // a directory
+
+    const std::string list = (dir / "chips.lst").string();
+    writeFile(list, P + " 6 1 2 FROMLIST\n");
+    writeFile(dir / "chips.acd", "IDCODELIST=" + P + " 6 1 2 OK:" + P + " 6 1 2 X\n");
+    try {
+        table.addEntriesFromFile(list.c_str(), false);
+        FAIL() << "no error";
+    } catch (const std::logic_error& e) {
+        EXPECT_EQ("Input error in file: " + (dir / "chips.acd").string() + " line:1 - bad data.", e.what());
+    }
+    EXPECT_EQ(2u, table.getEntryCount()); // FROMLIST and OK stay
+
+    // A bad line in the list itself: the data file is not read.
+    Jex_DeviceData other;
+    writeFile(list, P + " 6 1 2 FIRST\nbad\n");
+    EXPECT_THROW(other.addEntriesFromFile(list.c_str(), false), std::logic_error);
+    EXPECT_EQ(1u, other.getEntryCount());
+}
+
+TEST(DeviceDataFiles, MissingOrInvalidDataFilesAreSkipped)
+{
+    TempDir dir;
+    const std::string list = (dir / "chips.lst").string();
+    writeFile(list, P + " 6 1 2 FROMLIST\n");
+    Jex_DeviceData table;
+    table.addEntriesFromFile(list.c_str(), false); // no data file
+    EXPECT_EQ(1u, table.getEntryCount());
+
+    writeFile(dir / "chips.acd", "not a key value line\nIDCODELIST=" + std::string(32, '1') + " 4 0 0 IGNORED\n");
+    table.addEntriesFromFile(list.c_str(), false);
+    EXPECT_EQ(2u, table.getEntryCount());
+    EXPECT_EQ("", table.getDeviceName(-1));
+
+    writeFile(dir / "chips.acd", "OTHER=x\nIDCODELIST=\n");
+    table.addEntriesFromFile(list.c_str(), false);
+    EXPECT_EQ(3u, table.getEntryCount());
+}

@@ -1,0 +1,320 @@
+// The device database as a host sees it: the exported JexJtag_db_*
+// functions and the JexRT lookups.
+
+#include <gtest/gtest.h>
+
+#include <cstring>
+#include <filesystem>
+#include <sstream>
+#include <string>
+#include <vector>
+
+#include "jexjtag/JexRT.hpp"
+#include "support/TestSupport.hpp"
+
+using testsupport::IsolatedEnvironment;
+using testsupport::LogCapture;
+using testsupport::writeFile;
+
+namespace {
+
+// A few real devices, as an installation list would hold them.
+const char* const kInstalledList =
+    "# pattern                            IR fam sub name\n"
+    "XXXX0001010000010100000010010011      6  1   0  XC3S200\n"
+    "XXXX_0011_0110_0010_1101_0000_1001_0011 6 1 1 XC7A35T\n"
+    "XXXX0010000010100001000011011101,10,2,0,EPM240\n"
+    "XXXX1011101000000000010001110111  4  3   0  ARM_CORTEX_DAP   # SWJ-DP\n"
+    "\n";
+
+const char* const kXc3s200 = "00000001010000010100000010010011"; // 0x01414093
+const char* const kEpm240 = "00000010000010100001000011011101";  // 0x020A10DD
+
+class DeviceDbApiTest : public ::testing::Test {
+protected:
+    void SetUp() override
+    {
+        writeFile(env.dataDir() / "idcode.lst", kInstalledList);
+        handle = create();
+    }
+    void TearDown() override
+    {
+        if (handle != kNone) JexJtag_session_destroy(handle);
+    }
+    static unsigned create(std::vector<const char*> args = {})
+    {
+        unsigned h = kNone;
+        if (JexJtag_session_create(nullptr, static_cast<unsigned>(args.size()), args.empty() ? nullptr : args.data(),
+                                   &h) != JEX_SUCCESS)
+            return kNone;
+        return h;
+    }
+    unsigned add(const std::string& text, const char* name = "host.lst")
+    {
+        return JexJtag_db_addDeviceData(handle, name, text.data(), static_cast<unsigned>(text.size()));
+    }
+    struct Result {
+        unsigned status;
+        std::string name;
+        unsigned irlen;
+        std::string bypass;
+    };
+    Result lookup(const char* idcode)
+    {
+        char name[64];
+        char bypass[64];
+        unsigned irlen = 77;
+        const unsigned status = JexJtag_db_lookupDevice(handle, idcode, name, sizeof name, &irlen, bypass, sizeof bypass);
+        return {status, name, irlen, bypass};
+    }
+
+    static constexpr unsigned kNone = 0xFFFFFFFFu;
+    IsolatedEnvironment env;
+    unsigned handle = kNone;
+};
+
+} // namespace
+
+TEST_F(DeviceDbApiTest, RealDevicesAreFoundByTheirIdcodeText)
+{
+    ASSERT_NE(kNone, handle);
+    Result r = lookup(kXc3s200);
+    EXPECT_EQ(JEX_SUCCESS, r.status);
+    EXPECT_EQ("XC3S200", r.name);
+    EXPECT_EQ(6u, r.irlen);
+    EXPECT_EQ("111111", r.bypass);
+
+    r = lookup("0100" "1011101000000000010001110111"); // version 4: the don't-care bits
+    EXPECT_EQ("ARM_CORTEX_DAP", r.name);
+    EXPECT_EQ("1111", r.bypass);
+
+    char name[32];
+    EXPECT_EQ(JEX_SUCCESS, JexJtag_db_getDeviceNameForIdcode(handle, kEpm240, name, sizeof name));
+    EXPECT_STREQ("EPM240", name);
+    unsigned irlen = 0;
+    EXPECT_EQ(JEX_SUCCESS, JexJtag_db_getIRLengthForIdcode(handle, kEpm240, &irlen));
+    EXPECT_EQ(10u, irlen);
+    char bypass[16];
+    EXPECT_EQ(JEX_SUCCESS, JexJtag_db_getBypassForIdcode(handle, kEpm240, bypass, sizeof bypass));
+    EXPECT_STREQ("1111111111", bypass);
+
+    // A short text counts as having leading zeros; the number form agrees.
+    EXPECT_EQ(JEX_SUCCESS, add("00000000000000000000000000000101 3 0 0 FIVE\n"));
+    EXPECT_EQ("FIVE", lookup("101").name);
+    std::string found, bits;
+    EXPECT_EQ(JEX_SUCCESS, JexRT::idcodeLookup(handle, 0x020A10DDu, found, nullptr, nullptr, nullptr, bits, nullptr));
+    EXPECT_EQ("EPM240", found);
+}
+
+TEST_F(DeviceDbApiTest, HostListWinsOverTheInstallationsForTheSamePattern)
+{
+    ASSERT_NE(kNone, handle);
+    EXPECT_EQ(JEX_SUCCESS, add("XXXX0001010000010100000010010011 8 5 6 MY_XC3S200\n"));
+    EXPECT_EQ("MY_XC3S200", lookup(kXc3s200).name);
+
+    std::string name, bypass;
+    unsigned ir = 0, family = 0, sub = 0;
+    bool user = false;
+    EXPECT_EQ(JEX_SUCCESS, JexRT::idcodeLookup(handle, std::string(kXc3s200), name, &ir, &family, &sub, bypass, &user));
+    EXPECT_EQ("MY_XC3S200", name);
+    EXPECT_EQ(8u, ir);
+    EXPECT_EQ(5u, family);
+    EXPECT_EQ(6u, sub);
+    EXPECT_TRUE(user);
+    EXPECT_EQ("11111111", bypass);
+
+    EXPECT_EQ(JEX_SUCCESS, JexRT::idcodeLookup(handle, std::string(kEpm240), name, &ir, &family, &sub, bypass, &user));
+    EXPECT_EQ("EPM240", name);
+    EXPECT_FALSE(user);
+
+    std::istringstream more("XXXX0010000010100001000011011101 12 0 0 MY_EPM240\n");
+    EXPECT_EQ(JEX_SUCCESS, JexRT::addDeviceData(handle, "stream.lst", more));
+    EXPECT_EQ("MY_EPM240", lookup(kEpm240).name);
+    std::istringstream none("");
+    EXPECT_EQ(JEX_FAILURE, JexRT::addDeviceData(0x00770000u, "stream.lst", none));
+}
+
+TEST_F(DeviceDbApiTest, BadLineFailsAndKeepsTheLinesBeforeIt)
+{
+    ASSERT_NE(kNone, handle);
+    LogCapture log(2);
+    const std::string text = "00000000000000000000000000000001 3 0 0 ONE\n"
+                             "00000000000000000000000000000010 3 0 0 TWO\n"
+                             "0000000000000000000000000000001 3 0 0 SHORT\n"
+                             "00000000000000000000000000000011 3 0 0 NEVER\n";
+    EXPECT_EQ(JEX_FAILURE, add(text, "mine.lst"));
+    EXPECT_TRUE(log.has("*** EXCEPTION: Input error in file: mine.lst line:2 - bad data.\n"));
+    EXPECT_EQ("ONE", lookup("1").name);
+    EXPECT_EQ("TWO", lookup("10").name);
+    EXPECT_EQ("", lookup("11").name);
+    EXPECT_EQ("XC3S200", lookup(kXc3s200).name); // the installation's entries are all there
+}
+
+TEST_F(DeviceDbApiTest, OnlyBufsizeBytesAreReadEmbeddedNulIncluded)
+{
+    ASSERT_NE(kNone, handle);
+    const std::string first = "00000000000000000000000000000001 3 0 0 ONE\n";
+    const std::string text = first + "00000000000000000000000000000010 3 0 0 TWO\n";
+    EXPECT_EQ(JEX_SUCCESS, JexJtag_db_addDeviceData(handle, "cut.lst", text.data(), static_cast<unsigned>(first.size())));
+    EXPECT_EQ("ONE", lookup("1").name);
+    EXPECT_EQ("", lookup("10").name);
+
+    const std::string withNul = "00000000000000000000000000000010 3 0 0 TWO\n" + std::string(1, '\0') + "01\n";
+    EXPECT_EQ(JEX_FAILURE, add(withNul));
+    EXPECT_EQ("TWO", lookup("10").name);
+
+    EXPECT_EQ(JEX_SUCCESS, JexJtag_db_addDeviceData(handle, "empty.lst", nullptr, 0));
+    EXPECT_EQ(JEX_FAILURE, JexJtag_db_addDeviceData(handle, "null.lst", nullptr, 5));
+    EXPECT_EQ(JEX_FAILURE, JexJtag_db_addDeviceData(handle, nullptr, "", 0));
+    EXPECT_EQ(JEX_FAILURE, JexJtag_db_addDeviceData(0x00770000u, "x.lst", "", 0));
+}
+
+TEST_F(DeviceDbApiTest, UnknownCodeSucceedsWithEmptyOutputs)
+{
+    ASSERT_NE(kNone, handle);
+    char name[8];
+    char bypass[8];
+    std::memset(name, 'z', sizeof name);
+    std::memset(bypass, 'z', sizeof bypass);
+    unsigned irlen = 77;
+    EXPECT_EQ(JEX_SUCCESS, JexJtag_db_lookupDevice(handle, "1", name, sizeof name, &irlen, bypass, sizeof bypass));
+    EXPECT_EQ(std::string(8, '\0'), std::string(name, sizeof name));
+    EXPECT_EQ(0u, irlen);
+    EXPECT_EQ(std::string(8, '\0'), std::string(bypass, sizeof bypass));
+}
+
+TEST_F(DeviceDbApiTest, TextsAreCutToTheirBuffers)
+{
+    ASSERT_NE(kNone, handle);
+    EXPECT_EQ(JEX_SUCCESS, add("00000000000000000000000000000111 40 0 0 WIDE_IR_DEVICE\n"));
+    char bypass[64];
+    EXPECT_EQ(JEX_SUCCESS, JexJtag_db_getBypassForIdcode(handle, "111", bypass, 41));
+    EXPECT_EQ(std::string(40, '1'), bypass);
+    std::memset(bypass, 'z', sizeof bypass);
+    EXPECT_EQ(JEX_SUCCESS, JexJtag_db_getBypassForIdcode(handle, "111", bypass, 33));
+    EXPECT_EQ(std::string(32, '1'), bypass);
+    EXPECT_EQ('z', bypass[33]); // nothing beyond the buffer size
+
+    char name[8];
+    std::memset(name, 'z', sizeof name);
+    EXPECT_EQ(JEX_SUCCESS, JexJtag_db_getDeviceNameForIdcode(handle, kXc3s200, name, 4));
+    EXPECT_EQ(std::string("XC3\0zzzz", 8), std::string(name, 8));
+    std::memset(name, 'z', sizeof name);
+    EXPECT_EQ(JEX_SUCCESS, JexJtag_db_getDeviceNameForIdcode(handle, kEpm240, name, 8));
+    EXPECT_EQ(std::string("EPM240\0\0", 8), std::string(name, 8)); // padded with NUL bytes
+    EXPECT_EQ(JEX_SUCCESS, JexJtag_db_getDeviceNameForIdcode(handle, kEpm240, name, 1));
+    EXPECT_EQ('\0', name[0]);
+}
+
+TEST_F(DeviceDbApiTest, FailuresFillTheBuffers)
+{
+    ASSERT_NE(kNone, handle);
+    char name[8];
+    char bypass[8];
+    std::memset(name, 'z', sizeof name);
+    std::memset(bypass, 'z', sizeof bypass);
+    unsigned irlen = 77;
+    EXPECT_EQ(JEX_FAILURE,
+              JexJtag_db_lookupDevice(0x00770000u, kXc3s200, name, sizeof name, &irlen, bypass, sizeof bypass));
+    EXPECT_EQ(std::string(8, '\0'), std::string(name, sizeof name));
+    EXPECT_EQ(0u, irlen);
+    EXPECT_EQ(std::string(8, '\xFF'), std::string(bypass, sizeof bypass));
+
+    std::memset(bypass, 'z', sizeof bypass);
+    EXPECT_EQ(JEX_FAILURE, JexJtag_db_getBypassForIdcode(0x00770000u, kXc3s200, bypass, 5));
+    EXPECT_EQ(std::string(5, '\xFF') + "zzz", std::string(bypass, sizeof bypass));
+    irlen = 77;
+    EXPECT_EQ(JEX_FAILURE, JexJtag_db_getIRLengthForIdcode(0x00770000u, kXc3s200, &irlen));
+    EXPECT_EQ(0u, irlen);
+
+    // Null or unusable arguments fail cleanly.
+    irlen = 77;
+    EXPECT_EQ(JEX_FAILURE, JexJtag_db_lookupDevice(handle, nullptr, name, sizeof name, &irlen, bypass, sizeof bypass));
+    EXPECT_EQ(0u, irlen);
+    EXPECT_EQ(JEX_FAILURE, JexJtag_db_getDeviceNameForIdcode(handle, kXc3s200, name, 0));
+    EXPECT_EQ(JEX_FAILURE, JexJtag_db_getBypassForIdcode(handle, kXc3s200, bypass, 0));
+    EXPECT_EQ(JEX_SUCCESS, JexJtag_db_getIRLengthForIdcode(handle, kXc3s200, nullptr));
+    EXPECT_EQ(JEX_SUCCESS, JexJtag_db_lookupDevice(handle, kXc3s200, nullptr, 0, nullptr, nullptr, 0));
+
+    std::string text = "kept", bits = "kept";
+    unsigned ir = 5;
+    EXPECT_EQ(JEX_FAILURE, JexRT::idcodeLookup(0x00770000u, 1u, text, &ir, nullptr, nullptr, bits, nullptr));
+    EXPECT_EQ("kept", text);
+    EXPECT_EQ(5u, ir);
+}
+
+TEST_F(DeviceDbApiTest, TraceLines)
+{
+    ASSERT_NE(kNone, handle);
+    LogCapture log(3);
+    unsigned irlen = 0;
+    EXPECT_EQ(JEX_SUCCESS, JexJtag_db_getIRLengthForIdcode(handle, kEpm240, &irlen));
+    add("", "trace.lst");
+    const std::string h = std::to_string(handle);
+    std::vector<std::string> traced;
+    for (const std::string& line : log.lines())
+        if (line.rfind("JexJtag_db_", 0) == 0) traced.push_back(line);
+    const std::vector<std::string> expected = {
+        "JexJtag_db_getIRLengthForIdcode() handle=" + h + ", idcode=" + kEpm240 + "\n",
+        "JexJtag_db_lookupDevice() handle=" + h + ", idcode=" + kEpm240 + ", devicebuf_size=128, bypassbuf_size=33\n",
+        "JexJtag_db_lookupDevice() returning deviceName=EPM240, irlen=10, cmd_bypass=1111111111\n",
+        "JexJtag_db_getIRLengthForIdcode() returning irlen=10\n",
+        "JexJtag_db_addDeviceData() handle=" + h + ", filename=trace.lst, bufsize=0\n",
+    };
+    EXPECT_EQ(expected, traced);
+}
+
+TEST(DeviceDbSessionCreation, FailsWithoutAnIdcodeList)
+{
+    IsolatedEnvironment env;
+    std::filesystem::remove(env.dataDir() / "idcode.lst");
+    LogCapture log(1);
+    unsigned handle = 99;
+    EXPECT_EQ(JEX_FAILURE, JexJtag_session_create(nullptr, 0, nullptr, &handle));
+    EXPECT_EQ(0u, handle);
+    EXPECT_TRUE(log.has("\nError: Unable to open " + env.dataDir().string() + "/idcode.lst\n")) << log.text();
+
+    // The same through "datadir", given with a trailing separator.
+    const std::string arg = "datadir=" + env.home().string() + "/";
+    const char* argv[] = {arg.c_str()};
+    EXPECT_EQ(JEX_FAILURE, JexJtag_session_create(nullptr, 1, argv, &handle));
+    EXPECT_TRUE(log.has("\nError: Unable to open " + env.home().string() + "/idcode.lst\n")) << log.text();
+}
+
+TEST(DeviceDbSessionCreation, EmptyListGivesAnEmptyDatabase)
+{
+    IsolatedEnvironment env;
+    writeFile(env.dataDir() / "idcode.lst", "");
+    unsigned handle = 0;
+    ASSERT_EQ(JEX_SUCCESS, JexJtag_session_create(nullptr, 0, nullptr, &handle));
+    char name[16] = "x";
+    unsigned irlen = 5;
+    EXPECT_EQ(JEX_SUCCESS, JexJtag_db_getDeviceNameForIdcode(handle, kXc3s200, name, sizeof name));
+    EXPECT_STREQ("", name);
+    EXPECT_EQ(JEX_SUCCESS, JexJtag_db_getIRLengthForIdcode(handle, "0", &irlen));
+    EXPECT_EQ(0u, irlen);
+    JexJtag_session_destroy(handle);
+}
+
+TEST(DeviceDbShippedList, RealDevicesAndAHostListThatOverridesOne)
+{
+    IsolatedEnvironment env; // its data directory holds the build's idcode.lst
+    unsigned handle = 0;
+    ASSERT_EQ(JEX_SUCCESS, JexJtag_session_create(nullptr, 0, nullptr, &handle));
+    const char* xc7a35t = "00010011011000101101000010010011"; // 0x1362D093, version 1
+    char name[64];
+    char bypass[64];
+    unsigned irlen = 0;
+    ASSERT_EQ(JEX_SUCCESS, JexJtag_db_lookupDevice(handle, xc7a35t, name, sizeof name, &irlen, bypass, sizeof bypass));
+    EXPECT_STREQ("XC7A35T", name);
+    EXPECT_EQ(6u, irlen);
+    EXPECT_STREQ("111111", bypass);
+    EXPECT_EQ(JEX_SUCCESS, JexJtag_db_getDeviceNameForIdcode(handle, kXc3s200, name, sizeof name));
+    EXPECT_STREQ("XC3S200", name);
+
+    const std::string mine = "XXXX_0011_0110_0010_1101_0000_1001_0011 6 1 73 MY_ARTIX\n";
+    EXPECT_EQ(JEX_SUCCESS, JexJtag_db_addDeviceData(handle, "mine.lst", mine.data(), static_cast<unsigned>(mine.size())));
+    EXPECT_EQ(JEX_SUCCESS, JexJtag_db_getDeviceNameForIdcode(handle, xc7a35t, name, sizeof name));
+    EXPECT_STREQ("MY_ARTIX", name);
+    JexJtag_session_destroy(handle);
+}
