@@ -1,0 +1,329 @@
+// The built jexjtag program, run as a process against the simulated cable.
+
+#include <gtest/gtest.h>
+
+#include <unistd.h>
+
+#include <string>
+#include <vector>
+
+#include "MiniJson.hpp"
+#include "ProgramRunner.hpp"
+#include "jexjtag/jexjtag.h"
+
+using clitest::ProgramRunner;
+using clitest::RunResult;
+
+namespace {
+
+bool contains(const std::string& text, const std::string& part) { return text.find(part) != std::string::npos; }
+
+class CliProgramTest : public ::testing::Test {
+protected:
+    CliProgramTest()
+    {
+        // Each test drives its own simulated port, with lock files of its own.
+        m_lockDir = (runner.dir() / "locks").string();
+        std::filesystem::create_directories(m_lockDir);
+        runner.setEnv("JEXJTAG_LOCK_DIR", m_lockDir);
+        m_port = "clitest-" + std::to_string(getpid());
+    }
+
+    // jexjtag with args and the test's own port.
+    RunResult run(std::vector<std::string> args, bool withPort = true)
+    {
+        if (withPort) {
+            args.push_back("--arg");
+            args.push_back("port=" + m_port);
+        }
+        return runner.run(args);
+    }
+    // The same, expecting success and valid JSON on stdout.
+    minijson::Value runJson(std::vector<std::string> args)
+    {
+        args.push_back("--json");
+        const RunResult r = run(args);
+        EXPECT_EQ(0, r.exitCode) << r.err;
+        EXPECT_EQ("", r.err);
+        return minijson::parse(r.out);
+    }
+
+    ProgramRunner runner;
+    std::string m_lockDir;
+    std::string m_port;
+};
+
+// A usage error: exit 2, one "jexjtag: " line and a hint on stderr, nothing on stdout.
+void expectUsageError(const RunResult& r, const std::string& message)
+{
+    EXPECT_EQ(2, r.exitCode);
+    EXPECT_EQ("", r.out);
+    EXPECT_EQ(0u, r.err.find("jexjtag: " + message + "\nTry 'jexjtag")) << r.err;
+}
+
+} // namespace
+
+TEST_F(CliProgramTest, HelpExplainsEveryCommand)
+{
+    RunResult r = run({"--help"}, false);
+    EXPECT_EQ(0, r.exitCode);
+    EXPECT_EQ("", r.err);
+    for (const char* command : {"targets", "scan", "lookup", "bsdl", "shift", "info"})
+        EXPECT_TRUE(contains(r.out, "\n  " + std::string(command))) << command;
+    EXPECT_TRUE(contains(r.out, "Exit status"));
+
+    for (const char* command : {"targets", "scan", "lookup", "bsdl", "shift", "info"}) {
+        r = run({command, "--help"}, false);
+        EXPECT_EQ(0, r.exitCode) << command;
+        EXPECT_EQ(0u, r.out.find(std::string("Usage: jexjtag ") + command)) << command;
+        EXPECT_EQ(r.out, run({"help", command}, false).out);
+    }
+    r = run({"--version"}, false);
+    EXPECT_EQ(0, r.exitCode);
+    EXPECT_TRUE(contains(r.out, "libJexJtag API version 0x")) << r.out;
+}
+
+TEST_F(CliProgramTest, BadUsageExitsWithTwo)
+{
+    expectUsageError(run({}, false), "no command given");
+    expectUsageError(run({"scna"}, false), "unknown command 'scna'");
+    expectUsageError(run({"scan", "--device", "1"}, false), "option --device does not apply to 'scan'");
+    expectUsageError(run({"lookup"}, false), "'lookup' needs one IDCODE (0 given)");
+    expectUsageError(run({"lookup", "0362D093"}), "'0362D093' is not an IDCODE: write it as hex (0x0362D093) or "
+                                                  "as up to 32 binary digits");
+    expectUsageError(run({"shift", "dr"}), "'shift' needs data to shift, or --bits N to read only");
+    expectUsageError(run({"shift", "dr", "0xZ"}), "'0xZ' is not valid hexadecimal data");
+    expectUsageError(run({"shift", "dr", "0x1", "--exit", "nowhere"}, false),
+                     "'nowhere' is not a TAP state; use one of TEST_LOGIC_RESET, RUN_TEST_IDLE, SELECT_DR_SCAN, "
+                     "CAPTURE_DR, SHIFT_DR, EXIT1_DR, PAUSE_DR, EXIT2_DR, UPDATE_DR, SELECT_IR_SCAN, CAPTURE_IR, "
+                     "SHIFT_IR, EXIT1_IR, PAUSE_IR, EXIT2_IR, UPDATE_IR (or idle, reset)");
+    expectUsageError(run({"scan", "--log-level", "9"}, false), "--log-level needs a number from 0 to 5, not '9'");
+}
+
+TEST_F(CliProgramTest, TargetsListsTheSimulatedCable)
+{
+    RunResult r = run({"targets"}, false);
+    EXPECT_EQ(0, r.exitCode) << r.err;
+    EXPECT_TRUE(contains(r.out, "jtag_sim")) << r.out;
+
+    const minijson::Value doc = runJson({"targets", "--xml"});
+    bool found = false;
+    for (const minijson::Value& t : doc["targets"].items)
+        if (t["name"].str() == "jtag_sim") {
+            found = true;
+            EXPECT_TRUE(contains(t["xml"].str(), "<targetname>jtag_sim</targetname>")) << t["xml"].str();
+        }
+    EXPECT_TRUE(found);
+    EXPECT_EQ(doc["targets"].items.size(), doc["count"].uint());
+}
+
+TEST_F(CliProgramTest, ScanPrintsTheDefaultChainWithDeviceNames)
+{
+    const RunResult r = run({"scan"});
+    EXPECT_EQ(0, r.exitCode) << r.err;
+    EXPECT_EQ("", r.err);
+    EXPECT_EQ("jtag_sim: 3 devices (device 0 is nearest TDO)\n"
+              "  #  IDCODE      IR  DEVICE\n"
+              "  0  0x4BA00477   4  ARM_JTAG-DP\n"
+              "  1  0x0362D093   6  XC7A35T\n"
+              "  2  0x41111043   8  LFE5U-25F\n",
+              r.out);
+}
+
+TEST_F(CliProgramTest, ScanJsonOfAChainGivenOnTheCommandLine)
+{
+    const minijson::Value doc = runJson({"scan", "--chain", "0x0362D093:6,0x12345679:5"});
+    EXPECT_EQ("jtag_sim", doc["target"].str());
+    ASSERT_EQ(2u, doc["count"].uint());
+    const minijson::Value& artix = doc["devices"][0];
+    EXPECT_EQ(0u, artix["index"].uint());
+    EXPECT_EQ("0x0362D093", artix["idcode"].str());
+    EXPECT_EQ("00000011011000101101000010010011", artix["idcode_bits"].str());
+    EXPECT_EQ(6u, artix["ir_length"].uint());
+    EXPECT_EQ("XC7A35T", artix["name"].str());
+    EXPECT_TRUE(artix["known"].boolValue());
+    const minijson::Value& stranger = doc["devices"][1];
+    EXPECT_EQ("0x12345679", stranger["idcode"].str());
+    EXPECT_TRUE(stranger["name"].isNull());
+    EXPECT_FALSE(stranger["known"].boolValue());
+    // Autodetection takes IR lengths from the database: 0 for a device it does not know.
+    EXPECT_EQ(0u, stranger["ir_length"].uint());
+
+    // Without autodetection the plug-in's own IR lengths stay.
+    const minijson::Value plain = runJson({"scan", "--chain", "0x0362D093:6,0x12345679:5", "--no-autodetect"});
+    EXPECT_EQ(5u, plain["devices"][1]["ir_length"].uint());
+    EXPECT_EQ("XC7A35T", plain["devices"][0]["name"].str());
+}
+
+TEST_F(CliProgramTest, UnknownTargetTypeAndBadOpenArgumentsFailWithOne)
+{
+    RunResult r = run({"scan", "--target", "no_such_cable"});
+    EXPECT_EQ(1, r.exitCode);
+    EXPECT_EQ("", r.out);
+    EXPECT_TRUE(contains(r.err, "jexjtag: unknown target type 'no_such_cable'; available: ")) << r.err;
+    EXPECT_TRUE(contains(r.err, "jtag_sim")) << r.err;
+
+    // The plug-in refuses a bad chain: its message, then ours.
+    r = run({"scan", "--chain", "0x4BA00477:1"});
+    EXPECT_EQ(1, r.exitCode);
+    EXPECT_EQ("", r.out);
+    EXPECT_TRUE(contains(r.err, "error: ")) << r.err;
+    EXPECT_TRUE(contains(r.err, "jexjtag: cannot open target 'jtag_sim'\n")) << r.err;
+}
+
+TEST_F(CliProgramTest, LookupNamesKnownAndReportsUnknownIdcodes)
+{
+    RunResult r = run({"lookup", "0x0362D093"}, false);
+    EXPECT_EQ(0, r.exitCode) << r.err;
+    EXPECT_EQ("IDCODE     0x0362D093\nDevice     XC7A35T\nIR length  6\nBYPASS     111111\n", r.out);
+
+    // The version bits are not compared; bit text works as well.
+    minijson::Value doc = runJson({"lookup", "01010011011000101101000010010011"});
+    EXPECT_EQ("0x5362D093", doc["idcode"].str());
+    EXPECT_TRUE(doc["known"].boolValue());
+    EXPECT_EQ("XC7A35T", doc["name"].str());
+    EXPECT_EQ(6u, doc["ir_length"].uint());
+    EXPECT_EQ("111111", doc["bypass"].str());
+
+    doc = runJson({"lookup", "0x00000001"});
+    EXPECT_FALSE(doc["known"].boolValue());
+    EXPECT_TRUE(doc["name"].isNull());
+    EXPECT_EQ(0u, doc["ir_length"].uint());
+}
+
+TEST_F(CliProgramTest, DatadirChoosesTheDeviceList)
+{
+    testsupport::writeFile(runner.dir() / "data" / "idcode.lst",
+                           "XXXX_0001_0010_0011_0100_0101_0110_0111  5 1 0 MY_TEST_PART\n");
+    const minijson::Value doc =
+        runJson({"lookup", "0x01234567", "--datadir", (runner.dir() / "data").string()});
+    EXPECT_EQ("MY_TEST_PART", doc["name"].str());
+    EXPECT_EQ(5u, doc["ir_length"].uint());
+
+    const RunResult r = run({"lookup", "0x1", "--datadir", (runner.dir() / "missing").string()});
+    EXPECT_EQ(1, r.exitCode);
+    EXPECT_TRUE(contains(r.err, "jexjtag: cannot create a library session")) << r.err;
+}
+
+TEST_F(CliProgramTest, ShiftDeviceRegistersOfTheDefaultChain)
+{
+    // Capture-IR of a 6-bit IR: ...01.  Hex data is fitted to the device's IR.
+    RunResult r = run({"shift", "ir", "--device", "1", "0x09"});
+    EXPECT_EQ(0, r.exitCode) << r.err;
+    EXPECT_EQ("0x01\n", r.out);
+    r = run({"shift", "ir", "--device", "1", "001001"});
+    EXPECT_EQ("000001\n", r.out);
+
+    // The IDCODE instruction, then device 1's data register: its IDCODE.
+    minijson::Value doc = runJson({"shift", "dr", "--device", "1", "--ir", "0x09", "--bits", "32"});
+    EXPECT_EQ("dr", doc["register"].str());
+    EXPECT_EQ(1u, doc["device"].uint());
+    EXPECT_EQ(32u, doc["bits"].uint());
+    EXPECT_EQ("RUN_TEST_IDLE", doc["exit_state"].str());
+    EXPECT_TRUE(doc["tdi"].isNull());
+    EXPECT_EQ("0x0362D093", doc["tdo"].str());
+    EXPECT_EQ("00000011011000101101000010010011", doc["tdo_bits"].str());
+    EXPECT_EQ(6u, doc["instruction"]["bits"].uint());
+    EXPECT_EQ("0x09", doc["instruction"]["tdi"].str());
+    EXPECT_EQ("0x01", doc["instruction"]["tdo"].str());
+
+    // Device 2's IDCODE opcode is 0xE0; binary data written into its data register comes back shifted through.
+    r = run({"shift", "dr", "-d", "2", "--ir", "0xE0", "0b00000000000000000000000000000000"});
+    EXPECT_EQ(0, r.exitCode) << r.err;
+    EXPECT_EQ("0b01000001000100010001000001000011\n", r.out);
+}
+
+TEST_F(CliProgramTest, ShiftTheWholeChain)
+{
+    // Three IDCODEs, device 0's first out (the least significant bits).
+    RunResult r = run({"shift", "dr", "--bits", "96"});
+    EXPECT_EQ(0, r.exitCode) << r.err;
+    EXPECT_EQ("0x411110430362D0934BA00477\n", r.out);
+    // Four bits written: TDO holds the first four bits of device 0's IDCODE.
+    r = run({"shift", "dr", "0b1010"});
+    EXPECT_EQ("0b0111\n", r.out);
+
+    // The chain's IR (4 + 6 + 8 bits) captures ...01 in each device.
+    r = run({"shift", "ir", "--bits", "18", "0x3FFFF", "--exit", "pause-ir"});
+    EXPECT_EQ(0, r.exitCode) << r.err;
+    EXPECT_EQ("0x00411\n", r.out);
+    r = run({"shift", "ir", "0b111111111111111111"});
+    EXPECT_EQ("0b000000010000010001\n", r.out);
+}
+
+TEST_F(CliProgramTest, ShiftRefusesWhatDoesNotFitTheDevice)
+{
+    RunResult r = run({"shift", "dr", "--device", "3", "--bits", "1"});
+    EXPECT_EQ(1, r.exitCode);
+    EXPECT_EQ("jexjtag: there is no device 3: the chain has 3 devices\n", r.err);
+    r = run({"shift", "ir", "--device", "1", "0b101"});
+    EXPECT_EQ(1, r.exitCode);
+    EXPECT_EQ("jexjtag: device 1 has an IR length of 6, but 0b101 has 3 bits\n", r.err);
+    r = run({"shift", "ir", "--device", "1", "--bits", "8", "0x09"});
+    EXPECT_EQ("jexjtag: device 1 has an IR length of 6, but 0x09 has 8 bits\n", r.err);
+    r = run({"shift", "dr", "--device", "1", "--ir", "0b111", "0x0"});
+    EXPECT_EQ(1, r.exitCode);
+    EXPECT_EQ("jexjtag: device 1 has an IR length of 6, but 0b111 has 3 bits\n", r.err);
+    r = run({"shift", "ir", "--device", "1", "0xFF"});
+    EXPECT_EQ(1, r.exitCode);
+    EXPECT_EQ("jexjtag: data 0xFF does not fit into the 6-bit instruction register of device 1\n", r.err);
+    EXPECT_EQ("", r.out);
+}
+
+TEST_F(CliProgramTest, InfoShowsTheRecordAndTheApiVersion)
+{
+    RunResult r = run({"info"});
+    EXPECT_EQ(0, r.exitCode) << r.err;
+    EXPECT_TRUE(contains(r.out, "target_type   jtag_sim\n")) << r.out;
+    EXPECT_TRUE(contains(r.out, "api_version   0x")) << r.out;
+
+    const minijson::Value doc = runJson({"info", "--arg", "new_firmware=1"});
+    EXPECT_GT(doc["api_version"].uint(), 0u);
+    EXPECT_EQ(0u, doc["api_version_text"].str().find("Version "));
+    EXPECT_EQ("jtag_sim", doc["target_type"].str());
+    EXPECT_TRUE(doc["target"]["new_firmware"].boolValue());
+    EXPECT_EQ(m_port, doc["target"]["port"].str());
+
+    // AVOID_FIRMWARE_UPDATE closes such a target again: no success then.
+    r = run({"info", "--arg", "new_firmware=1", "--arg", "AVOID_FIRMWARE_UPDATE=true"});
+    EXPECT_EQ(1, r.exitCode);
+    EXPECT_TRUE(contains(r.err, "jexjtag: target 'jtag_sim' was closed again after opening")) << r.err;
+}
+
+TEST_F(CliProgramTest, ALockHeldElsewhereIsReportedClearly)
+{
+    // This process holds the port's lock through the library.
+    testsupport::ScopedEnv lockDir("JEXJTAG_LOCK_DIR", m_lockDir);
+    unsigned handle = 0;
+    ASSERT_EQ(JEX_SUCCESS, JexJtag_session_create(nullptr, 0, nullptr, &handle));
+    const std::string portArg = "port=" + m_port;
+    const char* args[] = {portArg.c_str()};
+    ASSERT_EQ(JEX_SUCCESS, JexJtag_target_open(handle, "jtag_sim", nullptr, 1, args, nullptr));
+    unsigned status = 0;
+    ASSERT_EQ(JEX_SUCCESS, JexJtag_target_lock(handle, 0, &status));
+
+    RunResult r = run({"scan", "--lock-wait", "100"});
+    EXPECT_EQ(1, r.exitCode);
+    EXPECT_EQ("", r.out);
+    EXPECT_TRUE(contains(r.err, "jexjtag: cannot lock target 'jtag_sim': locked by another process (waited 100 ms"))
+        << r.err;
+    // --no-lock goes ahead all the same.
+    r = run({"scan", "--no-lock"});
+    EXPECT_EQ(0, r.exitCode) << r.err;
+
+    EXPECT_EQ(JEX_SUCCESS, JexJtag_target_unlock(handle));
+    EXPECT_EQ(JEX_SUCCESS, JexJtag_session_destroy(handle));
+    r = run({"scan", "--lock-wait", "100"});
+    EXPECT_EQ(0, r.exitCode) << r.err;
+}
+
+TEST_F(CliProgramTest, LogLevelAndVerboseReachTheLibrary)
+{
+    const std::string logFile = (runner.dir() / "lib.log").string();
+    RunResult r = run({"scan", "--log-level", "3", "--log-file", logFile});
+    EXPECT_EQ(0, r.exitCode) << r.err;
+    const std::string log = testsupport::readFile(logFile);
+    EXPECT_TRUE(contains(log, "JexJtag_session_create() argc=0")) << log;
+    EXPECT_TRUE(contains(log, "JexJtag_tap_autodetectChain() handle=65536, algorithm=JEXJTAG_SCAN_DEFAULT")) << log;
+    EXPECT_TRUE(contains(log, "JexJtag_target_unlock() handle=65536")) << log;
+}

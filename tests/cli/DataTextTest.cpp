@@ -1,0 +1,139 @@
+// Bit buffers, the data notation of shift and the IDCODE notation.
+
+#include <gtest/gtest.h>
+
+#include <string>
+
+#include "BitVector.hpp"
+#include "DataText.hpp"
+#include "Idcode.hpp"
+#include "UsageError.hpp"
+
+using namespace jexjtag::cli;
+
+namespace {
+
+BitVector bitsOf(const std::string& text, std::optional<unsigned> count = std::nullopt)
+{
+    return parseData(text, count).bits;
+}
+
+} // namespace
+
+TEST(DataTextTest, TheLastDigitIsShiftedFirst)
+{
+    // 0x1F: bits 0..4 set; bit 0 is bit 0 of byte 0, the first bit shifted.
+    const DataValue hex = parseData("0x1F", std::nullopt);
+    EXPECT_EQ(DataNotation::Hex, hex.notation);
+    ASSERT_EQ(8u, hex.bits.size());
+    EXPECT_EQ((std::vector<uint8_t>{0x1F}), hex.bits.bytes());
+
+    // Binary, MSB first: "0b110" is bit 0 = 0, bit 1 = 1, bit 2 = 1.
+    const DataValue bin = parseData("0b110", std::nullopt);
+    EXPECT_EQ(DataNotation::PrefixedBinary, bin.notation);
+    ASSERT_EQ(3u, bin.bits.size());
+    EXPECT_FALSE(bin.bits.get(0));
+    EXPECT_TRUE(bin.bits.get(1));
+    EXPECT_TRUE(bin.bits.get(2));
+    EXPECT_EQ((std::vector<uint8_t>{0x06}), bin.bits.bytes());
+
+    const DataValue plain = parseData("0001", std::nullopt);
+    EXPECT_EQ(DataNotation::Binary, plain.notation);
+    EXPECT_EQ(4u, plain.bits.size());
+    EXPECT_TRUE(plain.bits.get(0));
+}
+
+TEST(DataTextTest, LengthFollowsTheDigitsWrittenOrBits)
+{
+    EXPECT_EQ(12u, bitsOf("0x01F").size()); // leading zeros count
+    EXPECT_EQ(32u, bitsOf("0x4BA0_0477").size());
+    EXPECT_EQ((std::vector<uint8_t>{0x77, 0x04, 0xA0, 0x4B}), bitsOf("0x4ba0_0477").bytes());
+    EXPECT_EQ(9u, bitsOf("1_0000_0000").size());
+
+    // --bits widens with zeros or drops leading zeros, never a 1.
+    const BitVector wide = bitsOf("0x1", 10u);
+    EXPECT_EQ(10u, wide.size());
+    EXPECT_EQ("0x001", wide.toHex());
+    EXPECT_EQ("0000000001", wide.toBinary());
+    EXPECT_EQ(6u, bitsOf("0x09", 6u).size());
+    EXPECT_EQ("001001", bitsOf("0x09", 6u).toBinary());
+    EXPECT_EQ(5u, bitsOf("0b00011", 5u).size());
+    EXPECT_EQ(2u, bitsOf("0b00011", 2u).size());
+    EXPECT_THROW(bitsOf("0x1F", 4u), UsageError);
+    EXPECT_THROW(bitsOf("0b111", 2u), UsageError);
+    EXPECT_THROW(bitsOf("0x1", 0u), UsageError);
+    EXPECT_THROW(bitsOf("0x1", kMaxDataBits + 1), UsageError);
+}
+
+TEST(DataTextTest, LongValuesKeepEveryBitInPlace)
+{
+    // 72 bits across nine bytes: 0x80 followed by 16 zero digits.
+    const BitVector bits = bitsOf("0x800000000000000001");
+    ASSERT_EQ(72u, bits.size());
+    EXPECT_TRUE(bits.get(0));
+    EXPECT_TRUE(bits.get(71));
+    for (unsigned i = 1; i < 71; ++i) EXPECT_FALSE(bits.get(i)) << i;
+    EXPECT_EQ("0x800000000000000001", bits.toHex());
+}
+
+TEST(DataTextTest, BadDataIsAUsageError)
+{
+    for (const char* text : {"", "0x", "0b", "0x_", "0xG1", "12", "0b102", "0x1 2", "x1", "-1"})
+        EXPECT_THROW(parseData(text, std::nullopt), UsageError) << text;
+    EXPECT_THROW(parseData("0x" + std::string(kMaxDataBits / 4 + 1, 'F'), std::nullopt), UsageError);
+    EXPECT_EQ(kMaxDataBits, parseData("0x" + std::string(kMaxDataBits / 4, 'F'), std::nullopt).bits.size());
+}
+
+TEST(DataTextTest, OutputUsesTheInputNotation)
+{
+    BitVector tdo(6);
+    tdo.set(0, true);
+    tdo.set(5, true);
+    EXPECT_EQ("0x21", formatData(tdo, DataNotation::Hex));
+    EXPECT_EQ("100001", formatData(tdo, DataNotation::Binary));
+    EXPECT_EQ("0b100001", formatData(tdo, DataNotation::PrefixedBinary));
+    // What goes in comes out unchanged.
+    for (const char* text : {"0x0362D093", "0x7", "0b1011", "0111000"}) {
+        const DataValue v = parseData(text, std::nullopt);
+        EXPECT_EQ(text, formatData(v.bits, v.notation));
+    }
+    EXPECT_EQ("0x", BitVector().toHex());
+    EXPECT_EQ("", BitVector().toBinary());
+}
+
+TEST(DataTextTest, BuffersFromTheLibraryIgnoreBitsPastTheLength)
+{
+    const uint8_t bytes[] = {0xFF, 0xFF};
+    const BitVector bits = BitVector::fromBytes(bytes, 12);
+    EXPECT_EQ((std::vector<uint8_t>{0xFF, 0x0F}), bits.bytes());
+    EXPECT_EQ("0xFFF", bits.toHex());
+    EXPECT_EQ(bits, bitsOf("0xFFF"));
+    EXPECT_NE(bits, bitsOf("0x0FFF"));
+    BitVector v(3);
+    v.set(7, true); // past the end: ignored
+    EXPECT_FALSE(v.get(7));
+    EXPECT_EQ((std::vector<uint8_t>{0x00}), v.bytes());
+}
+
+TEST(IdcodeTest, HexAndBinaryNotations)
+{
+    EXPECT_EQ(0x0362D093u, parseIdcode("0x0362D093"));
+    EXPECT_EQ(0x0362D093u, parseIdcode("0x362d093"));
+    EXPECT_EQ(0x0362D093u, parseIdcode("00000011011000101101000010010011"));
+    EXPECT_EQ(0x0362D093u, parseIdcode("0b0000_0011_0110_0010_1101_0000_1001_0011"));
+    EXPECT_EQ(5u, parseIdcode("101")); // short: leading zeros
+    EXPECT_EQ(0xFFFFFFFFu, parseIdcode("0xFFFFFFFF"));
+    for (const char* text : {"0362D093", "0x1FFFFFFFF", "0x", "111111111111111111111111111111111", "", "0xZZ"})
+        EXPECT_THROW(parseIdcode(text), UsageError) << text;
+}
+
+TEST(IdcodeTest, LibraryTextsAndDisplay)
+{
+    EXPECT_EQ("0x0362D093", idcodeHex(0x0362D093u));
+    EXPECT_EQ("00000011011000101101000010010011", idcodeBits(0x0362D093u));
+    EXPECT_EQ(0x0362D093u, idcodeFromBits("00000011011000101101000010010011").value());
+    EXPECT_EQ(5u, idcodeFromBits("101").value());
+    EXPECT_FALSE(idcodeFromBits("").has_value());
+    EXPECT_FALSE(idcodeFromBits("XXXX0011011000101101000010010011").has_value());
+    EXPECT_FALSE(idcodeFromBits(std::string(33, '0')).has_value());
+}

@@ -1,0 +1,134 @@
+// The JSON writer: layout, escaping, UTF-8 repair and misuse.
+
+#include <gtest/gtest.h>
+
+#include <sstream>
+#include <stdexcept>
+#include <string>
+
+#include "JsonWriter.hpp"
+#include "MiniJson.hpp"
+
+using jexjtag::cli::JsonWriter;
+
+namespace {
+
+bool isValidUtf8(const std::string& text)
+{
+    size_t i = 0;
+    while (i < text.size()) {
+        const unsigned char c = static_cast<unsigned char>(text[i]);
+        size_t n = c < 0x80 ? 1 : (c >> 5) == 0x6 ? 2 : (c >> 4) == 0xE ? 3 : (c >> 3) == 0x1E ? 4 : 0;
+        if (n == 0 || i + n > text.size()) return false;
+        for (size_t k = 1; k < n; ++k)
+            if ((static_cast<unsigned char>(text[i + k]) & 0xC0) != 0x80) return false;
+        i += n;
+    }
+    return true;
+}
+
+std::string roundTrip(const std::string& text)
+{
+    std::ostringstream out;
+    JsonWriter json(out);
+    json.string(text);
+    json.finish();
+    EXPECT_TRUE(isValidUtf8(out.str()));
+    return minijson::parse(out.str()).str();
+}
+
+} // namespace
+
+TEST(JsonWriterTest, NestedDocumentLayout)
+{
+    std::ostringstream out;
+    JsonWriter json(out);
+    json.beginObject();
+    json.key("name").string("jtag_sim");
+    json.key("count").number(2u);
+    json.key("big").number(uint64_t{0xFFFFFFFFFFFFFFFFu});
+    json.key("ok").boolean(true);
+    json.key("none").null();
+    json.key("empty").beginArray().endArray();
+    json.key("list").beginArray();
+    json.number(1u).beginObject().key("a").boolean(false).endObject();
+    json.endArray();
+    json.key("obj").beginObject().endObject();
+    json.endObject();
+    json.finish();
+    EXPECT_EQ("{\n"
+              "  \"name\": \"jtag_sim\",\n"
+              "  \"count\": 2,\n"
+              "  \"big\": 18446744073709551615,\n"
+              "  \"ok\": true,\n"
+              "  \"none\": null,\n"
+              "  \"empty\": [],\n"
+              "  \"list\": [\n"
+              "    1,\n"
+              "    {\n"
+              "      \"a\": false\n"
+              "    }\n"
+              "  ],\n"
+              "  \"obj\": {}\n"
+              "}\n",
+              out.str());
+    const minijson::Value doc = minijson::parse(out.str());
+    EXPECT_EQ("jtag_sim", doc["name"].str());
+    EXPECT_FALSE(doc["list"][1]["a"].boolValue());
+}
+
+TEST(JsonWriterTest, EscapesQuotesBackslashesAndControls)
+{
+    EXPECT_EQ(R"("\"\\\b\f\n\r\t\u0000\u001f")", JsonWriter::quote(std::string("\"\\\b\f\n\r\t\0\x1f", 9)));
+    EXPECT_EQ("\"\x7f~ \"", JsonWriter::quote("\x7f~ "));
+    // Every byte value survives a round trip when it is valid text.
+    std::string ascii;
+    for (int c = 0; c < 0x80; ++c) ascii += static_cast<char>(c);
+    EXPECT_EQ(ascii, roundTrip(ascii));
+    // Keys are escaped too.
+    std::ostringstream out;
+    JsonWriter json(out);
+    json.beginObject().key("k\"\n").string("v").endObject();
+    json.finish();
+    EXPECT_EQ("v", minijson::parse(out.str())["k\"\n"].str());
+}
+
+TEST(JsonWriterTest, ValidUtf8PassesAndInvalidBytesBecomeReplacementCharacters)
+{
+    const std::string valid = "Gr\xC3\xBC\xC3\x9F" "e \xE2\x82\xAC \xF0\x9F\x94\x8C";
+    EXPECT_EQ(valid, roundTrip(valid));
+    EXPECT_EQ("\"\\ufffd\"", JsonWriter::quote("\xFF"));
+    // One replacement per byte that is not part of a valid sequence.
+    EXPECT_EQ("\"a\\ufffd\\ufffdb\"", JsonWriter::quote("a\xE2\x82" "b")); // cut sequence
+    EXPECT_EQ("\"\\ufffd\\ufffd\"", JsonWriter::quote("\xC0\xAF"));   // overlong '/'
+    EXPECT_EQ("\"\\ufffd\\ufffd\\ufffd\"", JsonWriter::quote("\xED\xA0\x80")); // surrogate
+    EXPECT_EQ("\"\\ufffd\\ufffd\\ufffd\\ufffd\"", JsonWriter::quote("\xF4\x90\x80\x80")); // above U+10FFFF
+    EXPECT_EQ("\"\\ufffd\\ufffd\"", JsonWriter::quote("\xE2\x82")); // cut at the end
+    // Any byte soup gives valid JSON.
+    std::string soup;
+    for (int c = 0; c < 256; ++c) soup += static_cast<char>(c);
+    EXPECT_NO_THROW(roundTrip(soup + soup));
+}
+
+TEST(JsonWriterTest, MisuseIsRefused)
+{
+    std::ostringstream out;
+    {
+        JsonWriter json(out);
+        json.beginObject();
+        EXPECT_THROW(json.string("no key"), std::logic_error);
+        EXPECT_THROW(json.endArray(), std::logic_error);
+        json.key("k");
+        EXPECT_THROW(json.key("again"), std::logic_error);
+        EXPECT_THROW(json.endObject(), std::logic_error); // key without value
+    }
+    {
+        JsonWriter json(out);
+        EXPECT_THROW(json.key("top"), std::logic_error);
+        json.beginArray();
+        EXPECT_THROW(json.finish(), std::logic_error);
+        json.endArray();
+        EXPECT_THROW(json.null(), std::logic_error); // a second document
+        EXPECT_NO_THROW(json.finish());
+    }
+}

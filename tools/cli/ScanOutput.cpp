@@ -1,0 +1,61 @@
+#include "ScanOutput.hpp"
+
+#include "Idcode.hpp"
+#include "JsonWriter.hpp"
+#include "TextTable.hpp"
+
+namespace jexjtag::cli {
+
+namespace {
+
+// 0x... when the library's text is a plain 32-bit number, the text itself otherwise.
+std::string displayIdcode(const std::string& bits)
+{
+    const auto value = idcodeFromBits(bits);
+    return value ? idcodeHex(*value) : bits;
+}
+
+} // namespace
+
+void writeScanText(std::ostream& out, const ScanResult& result)
+{
+    const size_t count = result.devices.size();
+    if (count == 0) {
+        out << result.target << ": no devices found\n";
+        return;
+    }
+    out << result.target << ": " << count << (count == 1 ? " device" : " devices") << " (device 0 is nearest TDO)\n";
+    TextTable table({true, false, true, false});
+    table.addRow({"#", "IDCODE", "IR", "DEVICE"});
+    for (const ChainDevice& device : result.devices)
+        table.addRow({std::to_string(device.index), displayIdcode(device.idcodeBits), std::to_string(device.irLength),
+                      device.name.empty() ? "(unknown)" : device.name});
+    table.write(out, "  ");
+}
+
+void writeScanJson(std::ostream& out, const ScanResult& result)
+{
+    JsonWriter json(out);
+    json.beginObject();
+    json.key("target").string(result.target);
+    json.key("count").number(result.devices.size());
+    json.key("devices").beginArray();
+    for (const ChainDevice& device : result.devices) {
+        json.beginObject();
+        json.key("index").number(device.index);
+        const auto value = idcodeFromBits(device.idcodeBits);
+        if (value) json.key("idcode").string(idcodeHex(*value));
+        else json.key("idcode").null();
+        json.key("idcode_bits").string(device.idcodeBits);
+        json.key("ir_length").number(device.irLength);
+        if (device.name.empty()) json.key("name").null();
+        else json.key("name").string(device.name);
+        json.key("known").boolean(!device.name.empty());
+        json.endObject();
+    }
+    json.endArray();
+    json.endObject();
+    json.finish();
+}
+
+} // namespace jexjtag::cli

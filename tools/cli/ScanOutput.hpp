@@ -1,0 +1,25 @@
+#pragma once
+// The chain found by "scan", as text and as JSON.
+
+#include <ostream>
+#include <string>
+#include <vector>
+
+namespace jexjtag::cli {
+
+struct ChainDevice {
+    unsigned index = 0;
+    std::string idcodeBits; // as the library gives it: 32 '0'/'1', MSB first
+    unsigned irLength = 0;
+    std::string name; // empty: not in the device database
+};
+
+struct ScanResult {
+    std::string target;
+    std::vector<ChainDevice> devices;
+};
+
+void writeScanText(std::ostream& out, const ScanResult& result);
+void writeScanJson(std::ostream& out, const ScanResult& result);
+
+} // namespace jexjtag::cli
