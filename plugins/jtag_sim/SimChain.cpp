@@ -5,7 +5,7 @@ namespace jexsim {
 SimChain::SimChain(const std::vector<DeviceSpec>& devices)
 {
     m_devices.reserve(devices.size());
-    for (const DeviceSpec& spec : devices) m_devices.emplace_back(spec);
+    for (const DeviceSpec& device : devices) m_devices.emplace_back(device);
 }
 
 bool SimChain::clock(bool tms, bool tdi)

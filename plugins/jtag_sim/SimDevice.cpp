@@ -4,14 +4,14 @@ namespace jexsim {
 
 namespace {
 
-uint64_t resetInstruction(const DeviceSpec& spec)
+uint64_t resetInstruction(const DeviceSpec& description)
 {
-    return spec.hasIdcode ? spec.idcodeOpcode : spec.bypassOpcode();
+    return description.hasIdcode ? description.idcodeOpcode : description.bypassOpcode();
 }
 
 } // namespace
 
-SimDevice::SimDevice(const DeviceSpec& spec) : m_spec(spec), m_instruction(resetInstruction(spec)) {}
+SimDevice::SimDevice(const DeviceSpec& description) : m_spec(description), m_instruction(resetInstruction(description)) {}
 
 SimDevice::DataRegister SimDevice::selected() const
 {

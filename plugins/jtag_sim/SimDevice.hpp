@@ -28,9 +28,9 @@ class SimDevice {
 public:
     enum class DataRegister { Bypass, Idcode, User };
 
-    explicit SimDevice(const DeviceSpec& spec);
+    explicit SimDevice(const DeviceSpec& description);
 
-    const DeviceSpec& spec() const { return m_spec; }
+    const DeviceSpec& description() const { return m_spec; }
     JexJtagTapState state() const { return m_tap.state(); }
     uint64_t instruction() const { return m_instruction; }
     DataRegister selected() const;

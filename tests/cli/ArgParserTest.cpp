@@ -55,7 +55,7 @@ TEST(ArgParserTest, OptionsStandBeforeOrAfterTheCommandInBothForms)
     EXPECT_TRUE(o.noLock);
     EXPECT_TRUE(o.noAutodetect);
     EXPECT_EQ("my_cable", o.targetType);
-    // --arg and --chain keep their order; --chain is "chain=SPEC".
+    // --arg and --chain keep their order; --chain is "chain=CHAIN".
     EXPECT_EQ((std::vector<std::string>{"port=sim0", "chain=0x4BA00477:4", "vcd=/tmp/x.vcd"}), o.targetArgs);
     EXPECT_EQ(250u, o.lockWaitMs);
     EXPECT_EQ(3u, o.logLevel.value());

@@ -40,7 +40,7 @@ enum : unsigned {
     kAll = ~0u,
 };
 
-struct Spec {
+struct OptionSpec {
     Id id;
     const char* longName;
     char shortName;
@@ -48,7 +48,7 @@ struct Spec {
     unsigned commands;
 };
 
-const Spec kSpecs[] = {
+const OptionSpec kOptions[] = {
     {Id::Help, "help", 'h', false, kAll},
     {Id::Version, "version", 0, false, kAll},
     {Id::Json, "json", 0, false, kAll},
@@ -79,35 +79,35 @@ unsigned commandBit(Command command)
     }
 }
 
-const Spec* findLong(const std::string& name)
+const OptionSpec* findLong(const std::string& name)
 {
-    for (const Spec& spec : kSpecs)
-        if (name == spec.longName) return &spec;
+    for (const OptionSpec& option : kOptions)
+        if (name == option.longName) return &option;
     return nullptr;
 }
 
-const Spec* findShort(char name)
+const OptionSpec* findShort(char name)
 {
-    for (const Spec& spec : kSpecs)
-        if (spec.shortName != 0 && spec.shortName == name) return &spec;
+    for (const OptionSpec& option : kOptions)
+        if (option.shortName != 0 && option.shortName == name) return &option;
     return nullptr;
 }
 
-std::string displayName(const Spec& spec) { return std::string("--") + spec.longName; }
+std::string displayName(const OptionSpec& option) { return std::string("--") + option.longName; }
 
-unsigned numberValue(const Spec& spec, const std::string& value, unsigned maximum = 0xFFFFFFFFu)
+unsigned numberValue(const OptionSpec& option, const std::string& value, unsigned maximum = 0xFFFFFFFFu)
 {
     const auto number = parseUnsigned(value, maximum);
     if (!number)
-        throw UsageError(displayName(spec) + " needs a number" +
+        throw UsageError(displayName(option) + " needs a number" +
                          (maximum != 0xFFFFFFFFu ? " from 0 to " + std::to_string(maximum) : std::string()) +
                          ", not '" + value + "'");
     return *number;
 }
 
-void apply(Options& options, const Spec& spec, const std::string& value)
+void apply(Options& options, const OptionSpec& option, const std::string& value)
 {
-    switch (spec.id) {
+    switch (option.id) {
     case Id::Help: options.help = true; break;
     case Id::Version: options.version = true; break;
     case Id::Json: options.json = true; break;
@@ -127,9 +127,9 @@ void apply(Options& options, const Spec& spec, const std::string& value)
         if (value.empty()) throw UsageError("--chain needs a chain description such as 0x4BA00477:4,0x0362D093:6");
         options.targetArgs.push_back("chain=" + value);
         break;
-    case Id::LockWait: options.lockWaitMs = numberValue(spec, value); break;
+    case Id::LockWait: options.lockWaitMs = numberValue(option, value); break;
     case Id::NoLock: options.noLock = true; break;
-    case Id::LogLevel: options.logLevel = numberValue(spec, value, kMaxLogLevel); break;
+    case Id::LogLevel: options.logLevel = numberValue(option, value, kMaxLogLevel); break;
     case Id::LogFile:
         if (value.empty()) throw UsageError("--log-file needs a file name");
         options.logFile = value;
@@ -140,8 +140,8 @@ void apply(Options& options, const Spec& spec, const std::string& value)
         break;
     case Id::Xml: options.xml = true; break;
     case Id::NoAutodetect: options.noAutodetect = true; break;
-    case Id::Device: options.device = numberValue(spec, value); break;
-    case Id::Bits: options.bits = numberValue(spec, value); break;
+    case Id::Device: options.device = numberValue(option, value); break;
+    case Id::Bits: options.bits = numberValue(option, value); break;
     case Id::Exit: options.exitState = parseTapState(value); break;
     case Id::Ir:
         if (value.empty()) throw UsageError("--ir needs the instruction to shift");
@@ -198,7 +198,7 @@ void checkOperands(Options& options)
 Options ArgParser::parse(const std::vector<std::string>& args)
 {
     Options options;
-    std::vector<const Spec*> given;
+    std::vector<const OptionSpec*> given;
     bool optionsEnded = false;
     for (size_t i = 0; i < args.size(); ++i) {
         const std::string& arg = args[i];
@@ -232,22 +232,22 @@ Options ArgParser::parse(const std::vector<std::string>& args)
                 hasValue = true;
             }
         }
-        const Spec* spec = isLong ? findLong(name) : findShort(name[0]);
-        if (!spec) throw UsageError("unknown option '" + (isLong ? "--" + name : arg) + "'");
-        if (spec->takesValue && !hasValue) {
-            if (i + 1 >= args.size()) throw UsageError(displayName(*spec) + " needs a value");
+        const OptionSpec* option = isLong ? findLong(name) : findShort(name[0]);
+        if (!option) throw UsageError("unknown option '" + (isLong ? "--" + name : arg) + "'");
+        if (option->takesValue && !hasValue) {
+            if (i + 1 >= args.size()) throw UsageError(displayName(*option) + " needs a value");
             value = args[++i];
-        } else if (!spec->takesValue && hasValue) {
-            throw UsageError(displayName(*spec) + " takes no value");
+        } else if (!option->takesValue && hasValue) {
+            throw UsageError(displayName(*option) + " takes no value");
         }
-        apply(options, *spec, value);
-        given.push_back(spec);
+        apply(options, *option, value);
+        given.push_back(option);
     }
 
-    for (const Spec* spec : given)
-        if (spec->commands != kAll && options.command != Command::None &&
-            (spec->commands & commandBit(options.command)) == 0)
-            throw UsageError("option " + displayName(*spec) + " does not apply to '" + commandName(options.command) +
+    for (const OptionSpec* option : given)
+        if (option->commands != kAll && options.command != Command::None &&
+            (option->commands & commandBit(options.command)) == 0)
+            throw UsageError("option " + displayName(*option) + " does not apply to '" + commandName(options.command) +
                              "'");
     if (options.help || options.version) return options;
     checkOperands(options);

@@ -23,7 +23,7 @@ Commands:
 Options for every command:
   -t, --target TYPE      target type to open (default: jtag_sim)
   -a, --arg KEY=VALUE    open argument for the plug-in; repeatable
-      --chain SPEC       the same as --arg chain=SPEC (jtag_sim: the simulated
+      --chain CHAIN       the same as --arg chain=CHAIN (jtag_sim: the simulated
                          chain, e.g. 0x4BA00477:4,0x0362D093:6)
       --lock-wait MS     wait up to MS milliseconds for the cable lock
                          (default: 5000; 0 tries once)
@@ -77,7 +77,7 @@ Options:
                          taking them from the device database
       --json             {"target", "count", "devices": [{"index", "idcode",
                          "idcode_bits", "ir_length", "name", "known"}]}
-  -t, --target TYPE, -a, --arg KEY=VALUE, --chain SPEC, --lock-wait MS,
+  -t, --target TYPE, -a, --arg KEY=VALUE, --chain CHAIN, --lock-wait MS,
       --no-lock, --datadir DIR, --log-level N: see jexjtag --help
 
 Examples:
@@ -124,7 +124,7 @@ vendor, frequency, port, flags) and the library's API version.
 
 Options:
       --json      {"api_version", "api_version_text", "target": {...}}
-  -t, --target TYPE, -a, --arg KEY=VALUE, --chain SPEC: see jexjtag --help
+  -t, --target TYPE, -a, --arg KEY=VALUE, --chain CHAIN: see jexjtag --help
 
 Examples:
   jexjtag info
@@ -166,7 +166,7 @@ Options:
       --no-autodetect  with --device: keep the IR lengths the plug-in found
       --json         {"register", "device", "bits", "exit_state", "tdi",
                      "tdo", "tdo_bits", "instruction": {"bits", "tdi", "tdo"}}
-  -t, --target TYPE, -a, --arg KEY=VALUE, --chain SPEC, --lock-wait MS:
+  -t, --target TYPE, -a, --arg KEY=VALUE, --chain CHAIN, --lock-wait MS:
                      see jexjtag --help
 
 STATE is one of )HELP";
