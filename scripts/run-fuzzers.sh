@@ -35,9 +35,16 @@ for fuzzer in "$build"/fuzz/*; do
     seeds=()
     [[ -d $corpus ]] && seeds=("$corpus")
     echo "== $name: ${seconds}s on ${seeds[*]:-an empty corpus}"
+    log=$build/$name.log
     "$fuzzer" -max_total_time="$seconds" -timeout=10 -print_final_stats=1 \
-        -artifact_prefix="$artifacts/$name-" "$work" "${seeds[@]}"
+        -artifact_prefix="$artifacts/$name-" "$work" "${seeds[@]}" > "$log" 2>&1
     status=$?
+    # The full run is in the log; show its summary (or its end, on failure).
+    if [[ $status -eq 0 ]]; then
+        grep -E '^(Done|stat::number_of_executed_units|stat::peak_rss_mb)' "$log" | sed 's/^/   /'
+    else
+        tail -n 40 "$log"
+    fi
     rm -rf "$work"
     ran=$((ran + 1))
     if [[ $status -ne 0 ]]; then
@@ -52,5 +59,5 @@ if [[ $ran -eq 0 ]]; then
     echo "no fuzzer found in $build/fuzz"
     exit 1
 fi
-echo "$((ran - ${#failed[@]})) passed, ${#failed[@]} failed"
+echo "fuzzing: $((ran - ${#failed[@]})) of $ran fuzzers found nothing"
 [[ ${#failed[@]} -eq 0 ]]

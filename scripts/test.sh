@@ -6,19 +6,26 @@ set -euo pipefail
 here="$(cd "$(dirname "$0")/.." && pwd)"
 "$here/scripts/setup.sh"
 
+total=0
 run_suite() {
   local dir="$1"; shift
   echo "=== build $(basename "$dir")"
   "$here/scripts/build.sh" "$dir" "$@"
   echo "=== test $(basename "$dir")"
-  (cd "$dir" && ctest --output-on-failure -j"$(nproc)")
+  (cd "$dir" && ctest --output-on-failure -j"$(nproc)") | tee "$dir/ctest.log"
+  local n
+  n=$(sed -n 's/.*tests passed, 0 tests failed out of \([0-9]*\).*/\1/p' "$dir/ctest.log")
+  total=$((total + ${n:-0}))
 }
 
 run_suite "$here/build" -DCMAKE_BUILD_TYPE=RelWithDebInfo
 ASAN_OPTIONS=detect_leaks=1 UBSAN_OPTIONS=print_stacktrace=1:halt_on_error=1 \
   run_suite "$here/build-asan" -DCMAKE_BUILD_TYPE=Debug -DJEXJTAG_SANITIZE=ON -DJEXJTAG_BUILD_BENCHMARKS=OFF
 
+fuzzers=0
 if [ -x "$here/scripts/run-fuzzers.sh" ]; then
   "$here/scripts/run-fuzzers.sh" "$here/build-fuzz"
+  fuzzers=$(find "$here/build-fuzz/fuzz" -maxdepth 1 -type f -executable | wc -l)
 fi
-echo "=== all tests passed"
+echo "=== all tests passed (normal and sanitizer builds, then the fuzzers)"
+echo "$((total + fuzzers)) passed, 0 failed"
