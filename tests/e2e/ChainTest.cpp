@@ -14,7 +14,7 @@ using namespace e2e;
 
 namespace {
 
-using ChainTest = SimSession;
+using E2eChainTest = SimSession;
 
 constexpr unsigned kIdcodeOp[3] = {0xE, 0x9, 0xE0};
 constexpr unsigned kUserOp[3] = {0xA, 0x2, 0x32};
@@ -26,7 +26,7 @@ bool contains(const std::string& text, const std::string& part) { return text.fi
 
 } // namespace
 
-TEST_F(ChainTest, TypicalUseFromSessionToDestroy)
+TEST_F(E2eChainTest, TypicalUseFromSessionToDestroy)
 {
     // The plug-in tree of the build offers jtag_sim with its descriptor.
     unsigned count = 0;
@@ -77,7 +77,7 @@ TEST_F(ChainTest, TypicalUseFromSessionToDestroy)
     EXPECT_TRUE(messagesOfType(JEX_MSG_WARNING).empty());
 }
 
-TEST_F(ChainTest, AutodetectCorrectsGuessedIrLengthsFromTheDeviceDatabase)
+TEST_F(E2eChainTest, AutodetectCorrectsGuessedIrLengthsFromTheDeviceDatabase)
 {
     // The last device's Capture-IR value (binary 00000101) shows two places
     // where an IR could start; the plug-in's scan guesses 4, 8, 6 and says so.
@@ -103,7 +103,7 @@ TEST_F(ChainTest, AutodetectCorrectsGuessedIrLengthsFromTheDeviceDatabase)
     EXPECT_EQ(kEcp5Id, readDeviceDR(2, 32));
 }
 
-TEST_F(ChainTest, AutodetectGivesDevicesTheDatabaseDoesNotKnowIrLengthZero)
+TEST_F(E2eChainTest, AutodetectGivesDevicesTheDatabaseDoesNotKnowIrLengthZero)
 {
     const char* unknown = "00010010001101000101011001111111"; // 0x1234567F
     unsigned dbLength = 99;
@@ -128,7 +128,7 @@ TEST_F(ChainTest, AutodetectGivesDevicesTheDatabaseDoesNotKnowIrLengthZero)
     EXPECT_TRUE(messagesOfType(JEX_MSG_ERROR).empty());
 }
 
-TEST_F(ChainTest, DeviceShiftsAddressOnlyTheirDevice)
+TEST_F(E2eChainTest, DeviceShiftsAddressOnlyTheirDevice)
 {
     ASSERT_EQ(JEX_SUCCESS, open(kThreeDevices));
     ASSERT_EQ(JEX_SUCCESS, JexJtag_tap_autodetectChain(m_handle, JEXJTAG_SCAN_DEFAULT));
@@ -157,7 +157,7 @@ TEST_F(ChainTest, DeviceShiftsAddressOnlyTheirDevice)
     EXPECT_EQ("jtag_sim: device 3 is outside the chain of 3 devices", errors[0]);
 }
 
-TEST_F(ChainTest, UserRegistersKeepWhatWasWritten)
+TEST_F(E2eChainTest, UserRegistersKeepWhatWasWritten)
 {
     ASSERT_EQ(JEX_SUCCESS, open(kThreeDevices));
     ASSERT_EQ(JEX_SUCCESS, JexJtag_tap_autodetectChain(m_handle, JEXJTAG_SCAN_DEFAULT));
@@ -191,7 +191,7 @@ TEST_F(ChainTest, UserRegistersKeepWhatWasWritten)
     EXPECT_EQ(0u, readDeviceDR(0, 35));
 }
 
-TEST_F(ChainTest, WholeChainReadsShowCapturePatternsAndResumeFromPause)
+TEST_F(E2eChainTest, WholeChainReadsShowCapturePatternsAndResumeFromPause)
 {
     // Capture-IR values 1101, 111101, 11110001 (binary) for devices 0, 1, 2.
     ASSERT_EQ(JEX_SUCCESS, open("0x4BA00477:4:idcode=0xE:capture=0xD,0x0362D093:6:idcode=0x9:capture=0x3D,"
@@ -229,7 +229,7 @@ TEST_F(ChainTest, WholeChainReadsShowCapturePatternsAndResumeFromPause)
     EXPECT_EQ(kEcp5Id, valueOf(rest, 44, 32));
 }
 
-TEST_F(ChainTest, PinsWalkTheTapControllerAndReadTheIdcodes)
+TEST_F(E2eChainTest, PinsWalkTheTapControllerAndReadTheIdcodes)
 {
     ASSERT_EQ(JEX_SUCCESS, open(kThreeDevices));
     ASSERT_EQ(JEX_SUCCESS, JexJtag_tap_autodetectChain(m_handle, JEXJTAG_SCAN_DEFAULT));

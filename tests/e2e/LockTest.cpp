@@ -19,7 +19,7 @@ using namespace e2e;
 
 namespace {
 
-using LockTest = SimSession;
+using E2eLockTest = SimSession;
 
 void ignoreMessage(unsigned, unsigned, const char*) {}
 
@@ -77,7 +77,7 @@ char readByte(int fd, int timeoutMs)
 
 } // namespace
 
-TEST_F(LockTest, AnotherProcessHoldsThePortUntilItIsKilled)
+TEST_F(E2eLockTest, AnotherProcessHoldsThePortUntilItIsKilled)
 {
     int pipeFds[2];
     ASSERT_EQ(0, pipe(pipeFds));
@@ -113,7 +113,7 @@ TEST_F(LockTest, AnotherProcessHoldsThePortUntilItIsKilled)
     ASSERT_EQ(JEX_SUCCESS, JexJtag_target_unlock(m_handle));
 }
 
-TEST_F(LockTest, LockObjectsNestAndTheOutermostReleases)
+TEST_F(E2eLockTest, LockObjectsNestAndTheOutermostReleases)
 {
     ASSERT_EQ(JEX_SUCCESS, open(kThreeDevices));
     // A second session of this process opens the same port: it contends
