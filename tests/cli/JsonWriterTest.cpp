@@ -13,28 +13,13 @@ using jexjtag::cli::JsonWriter;
 
 namespace {
 
-bool isValidUtf8(const std::string& text)
-{
-    size_t i = 0;
-    while (i < text.size()) {
-        const unsigned char c = static_cast<unsigned char>(text[i]);
-        size_t n = c < 0x80 ? 1 : (c >> 5) == 0x6 ? 2 : (c >> 4) == 0xE ? 3 : (c >> 3) == 0x1E ? 4 : 0;
-        if (n == 0 || i + n > text.size()) return false;
-        for (size_t k = 1; k < n; ++k)
-            if ((static_cast<unsigned char>(text[i + k]) & 0xC0) != 0x80) return false;
-        i += n;
-    }
-    return true;
-}
-
 std::string roundTrip(const std::string& text)
 {
     std::ostringstream out;
     JsonWriter json(out);
     json.string(text);
     json.finish();
-    EXPECT_TRUE(isValidUtf8(out.str()));
-    return minijson::parse(out.str()).str();
+    return minijson::parse(out.str()).str(); // the reader insists on valid UTF-8
 }
 
 } // namespace
@@ -72,9 +57,6 @@ TEST(JsonWriterTest, NestedDocumentLayout)
               "  \"obj\": {}\n"
               "}\n",
               out.str());
-    const minijson::Value doc = minijson::parse(out.str());
-    EXPECT_EQ("jtag_sim", doc["name"].str());
-    EXPECT_FALSE(doc["list"][1]["a"].boolValue());
 }
 
 TEST(JsonWriterTest, EscapesQuotesBackslashesAndControls)
@@ -99,12 +81,13 @@ TEST(JsonWriterTest, ValidUtf8PassesAndInvalidBytesBecomeReplacementCharacters)
     EXPECT_EQ(valid, roundTrip(valid));
     EXPECT_EQ("\"\\ufffd\"", JsonWriter::quote("\xFF"));
     // One replacement per byte that is not part of a valid sequence.
-    EXPECT_EQ("\"a\\ufffd\\ufffdb\"", JsonWriter::quote("a\xE2\x82" "b")); // cut sequence
-    EXPECT_EQ("\"\\ufffd\\ufffd\"", JsonWriter::quote("\xC0\xAF"));   // overlong '/'
-    EXPECT_EQ("\"\\ufffd\\ufffd\\ufffd\"", JsonWriter::quote("\xED\xA0\x80")); // surrogate
-    EXPECT_EQ("\"\\ufffd\\ufffd\\ufffd\\ufffd\"", JsonWriter::quote("\xF4\x90\x80\x80")); // above U+10FFFF
-    EXPECT_EQ("\"\\ufffd\\ufffd\"", JsonWriter::quote("\xE2\x82")); // cut at the end
-    // Any byte soup gives valid JSON.
+    const std::string r = "\\ufffd";
+    EXPECT_EQ("\"a" + r + r + "b\"", JsonWriter::quote("a\xE2\x82" "b")); // cut sequence
+    EXPECT_EQ("\"" + r + r + "\"", JsonWriter::quote("\xC0\xAF"));           // overlong '/'
+    EXPECT_EQ("\"" + r + r + r + "\"", JsonWriter::quote("\xED\xA0\x80"));    // surrogate
+    EXPECT_EQ("\"" + r + r + r + r + "\"", JsonWriter::quote("\xF4\x90\x80\x80")); // above U+10FFFF
+    EXPECT_EQ("\"" + r + r + "\"", JsonWriter::quote("\xE2\x82"));           // cut at the end
+    // Any byte soup gives valid JSON in valid UTF-8.
     std::string soup;
     for (int c = 0; c < 256; ++c) soup += static_cast<char>(c);
     EXPECT_NO_THROW(roundTrip(soup + soup));

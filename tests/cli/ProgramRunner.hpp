@@ -31,13 +31,14 @@ class ProgramRunner {
 public:
     ProgramRunner()
     {
-        // A private home (for per-user files) and no log settings from outside.
+        // A private home (for per-user files) and no log, plug-in or data settings from outside.
         m_env["HOME"] = (m_dir / "home").string();
         std::filesystem::create_directories(m_dir / "home");
-        m_unset = {"JEXJTAG_LOG_LEVEL", "JEXJTAG_LOG_FILE", "JEXJTAG_PLUGIN_DIR", "JEXJTAG_DATA_DIR"};
+        for (const char* name : {"JEXJTAG_LOG_LEVEL", "JEXJTAG_LOG_FILE", "JEXJTAG_PLUGIN_DIR", "JEXJTAG_DATA_DIR"})
+            m_env[name] = "";
     }
 
-    // Sets (or with an empty value keeps unset) a variable for later runs.
+    // Sets a variable for later runs (an empty value keeps it unset).
     void setEnv(const std::string& name, const std::string& value) { m_env[name] = value; }
     const testsupport::TempDir& dir() const { return m_dir; }
 
@@ -62,8 +63,7 @@ public:
         for (char** e = environ; *e; ++e) {
             const std::string entry = *e;
             const std::string name = entry.substr(0, entry.find('='));
-            if (m_env.count(name) || isUnset(name)) continue;
-            envStore.push_back(entry);
+            if (!m_env.count(name)) envStore.push_back(entry);
         }
         for (const auto& [name, value] : m_env)
             if (!value.empty()) envStore.push_back(name + "=" + value);
@@ -86,16 +86,8 @@ public:
     }
 
 private:
-    bool isUnset(const std::string& name) const
-    {
-        for (const std::string& u : m_unset)
-            if (u == name) return true;
-        return false;
-    }
-
     testsupport::TempDir m_dir;
     std::map<std::string, std::string> m_env;
-    std::vector<std::string> m_unset;
 };
 
 } // namespace clitest

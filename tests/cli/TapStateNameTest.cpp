@@ -2,13 +2,15 @@
 
 #include <gtest/gtest.h>
 
+#include <utility>
+
 #include "TapStateName.hpp"
 #include "UsageError.hpp"
 #include "jexjtag/types.h"
 
 using namespace jexjtag::cli;
 
-TEST(TapStateNameTest, CanonicalNamesRoundTrip)
+TEST(TapStateNameTest, CanonicalNamesNumbersAndFriendlySpellings)
 {
     for (unsigned s = 0; s < JEXJTAG_STATE_SIZE; ++s) {
         EXPECT_EQ(s, parseTapState(tapStateName(s)));
@@ -16,18 +18,11 @@ TEST(TapStateNameTest, CanonicalNamesRoundTrip)
         EXPECT_EQ(s, parseTapState(std::to_string(s)));
     }
     EXPECT_EQ("STATE_16", tapStateName(16));
-}
-
-TEST(TapStateNameTest, FriendlySpellings)
-{
-    EXPECT_EQ(unsigned{JEXJTAG_RUN_TEST_IDLE}, parseTapState("idle"));
-    EXPECT_EQ(unsigned{JEXJTAG_RUN_TEST_IDLE}, parseTapState("run-test-idle"));
-    EXPECT_EQ(unsigned{JEXJTAG_RUN_TEST_IDLE}, parseTapState("JEXJTAG_RUN_TEST_IDLE"));
-    EXPECT_EQ(unsigned{JEXJTAG_RUN_TEST_IDLE}, parseTapState("jexjtag-run-test-idle"));
-    EXPECT_EQ(unsigned{JEXJTAG_TEST_LOGIC_RESET}, parseTapState("reset"));
-    EXPECT_EQ(unsigned{JEXJTAG_TEST_LOGIC_RESET}, parseTapState("TLR"));
-    EXPECT_EQ(unsigned{JEXJTAG_PAUSE_DR}, parseTapState("pause-dr"));
-    EXPECT_EQ(unsigned{JEXJTAG_PAUSE_IR}, parseTapState("Pause_IR"));
+    const std::pair<const char*, unsigned> friendly[] = {
+        {"idle", JEXJTAG_RUN_TEST_IDLE}, {"run-test-idle", JEXJTAG_RUN_TEST_IDLE},
+        {"jexjtag-run-test-idle", JEXJTAG_RUN_TEST_IDLE}, {"reset", JEXJTAG_TEST_LOGIC_RESET},
+        {"TLR", JEXJTAG_TEST_LOGIC_RESET}, {"pause-dr", JEXJTAG_PAUSE_DR}, {"Pause_IR", JEXJTAG_PAUSE_IR}};
+    for (const auto& [name, state] : friendly) EXPECT_EQ(state, parseTapState(name)) << name;
 }
 
 TEST(TapStateNameTest, OtherNamesAreUsageErrors)
