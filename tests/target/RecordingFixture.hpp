@@ -8,6 +8,7 @@
 #include <cstdint>
 #include <cstdio>
 #include <algorithm>
+#include <bitset>
 #include <filesystem>
 #include <sstream>
 #include <string>
@@ -137,11 +138,6 @@ protected:
 };
 
 // The 32-character '0'/'1' text of code, bit 31 first.
-inline std::string bits(unsigned code)
-{
-    std::string text;
-    for (int bit = 31; bit >= 0; --bit) text += ((code >> bit) & 1u) ? '1' : '0';
-    return text;
-}
+inline std::string bits(unsigned code) { return std::bitset<32>(code).to_string(); }
 
 } // namespace targettest
