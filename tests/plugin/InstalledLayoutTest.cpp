@@ -4,7 +4,7 @@
 
 #include <gtest/gtest.h>
 
-#include <cstdlib>
+#include <stdlib.h>
 #include <filesystem>
 #include <string>
 
@@ -20,28 +20,6 @@ namespace {
 
 namespace fs = std::filesystem;
 
-// Unsets an environment variable for the scope.
-class ScopedUnset {
-public:
-    explicit ScopedUnset(const char* name) : m_name(name)
-    {
-        if (const char* old = std::getenv(name)) {
-            m_had = true;
-            m_old = old;
-        }
-        unsetenv(name);
-    }
-    ~ScopedUnset()
-    {
-        if (m_had) setenv(m_name.c_str(), m_old.c_str(), 1);
-    }
-
-private:
-    std::string m_name;
-    std::string m_old;
-    bool m_had = false;
-};
-
 template <typename Fn>
 Fn need(const jexplatform::DynamicLibrary& lib, const char* name)
 {
@@ -54,10 +32,12 @@ TEST(InstalledLayout, ACPluginBesideTheLibraryIsListedWithItsDescriptor)
 {
     testsupport::TempDir prefix;
     testsupport::ScopedEnv home("HOME", prefix.str());
-    ScopedUnset pluginDir("JEXJTAG_PLUGIN_DIR");
+    // Neither directory setting: both come from where the library is.
+    testsupport::ScopedEnv pluginDir("JEXJTAG_PLUGIN_DIR", ""), dataDir("JEXJTAG_DATA_DIR", "");
+    unsetenv("JEXJTAG_PLUGIN_DIR");
+    unsetenv("JEXJTAG_DATA_DIR");
 
     // <prefix>/lib/libJexJtag.so and <prefix>/lib/plugins/example/loopback/.
-    ScopedUnset dataDir("JEXJTAG_DATA_DIR");
     const fs::path lib = prefix / "lib";
     fs::create_directories(lib);
     fs::copy_file(fs::canonical(fs::path(JEXJTAG_TEST_BUILD_DIR) / "lib" / "libJexJtag.so"), lib / "libJexJtag.so");

@@ -11,31 +11,20 @@
 
 static uint32_t open_op(JexPluginInstance* self, uint32_t argc, const char** argv, JexJtagCallContext* context)
 {
-    (void)self;
-    (void)argc;
-    (void)argv;
-    (void)context;
+    (void)self, (void)argc, (void)argv, (void)context;
     return JEX_SUCCESS;
 }
 
 static uint32_t command_op(JexPluginInstance* self, const char* command, const uint8_t* in, uint32_t inLength,
                            uint8_t* out, uint32_t* outLength, JexJtagCallContext* context)
 {
-    (void)self;
-    (void)command;
-    (void)in;
-    (void)inLength;
-    (void)out;
-    (void)outLength;
-    (void)context;
+    (void)self, (void)command, (void)in, (void)inLength, (void)out, (void)outLength, (void)context;
     return JEX_SUCCESS;
 }
 
 static void send_message(uint32_t handle, uint32_t type, const char* text)
 {
-    (void)handle;
-    (void)type;
-    (void)text;
+    (void)handle, (void)type, (void)text;
 }
 
 int main(void)

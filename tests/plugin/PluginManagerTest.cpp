@@ -23,21 +23,15 @@ using JexRT::PluginModule;
 using testsupport::LogCapture;
 using testsupport::PluginTree;
 
-// The lines of `log` that start with `prefix`, in order.
-Lines linesStartingWith(const LogCapture& log, const std::string& prefix)
+const std::string kDiscovery = "PluginManager::addAllPlugins() - ";
+
+// The discovery lines of `log`, in order.
+Lines discoveryLines(const LogCapture& log)
 {
     Lines out;
     for (const std::string& line : log.lines())
-        if (line.compare(0, prefix.size(), prefix) == 0) out.push_back(line);
+        if (line.compare(0, kDiscovery.size(), kDiscovery) == 0) out.push_back(line);
     return out;
-}
-
-Lines discoveryLines(const LogCapture& log) { return linesStartingWith(log, "PluginManager::addAllPlugins() - "); }
-
-ptrdiff_t position(const Lines& lines, const std::string& line)
-{
-    const auto it = std::find(lines.begin(), lines.end(), line);
-    return it == lines.end() ? -1 : it - lines.begin();
 }
 
 struct Target {
@@ -65,35 +59,33 @@ protected:
     testsupport::EntryLog entries;
 };
 
-TEST_F(PluginManagerTest, LoadModuleRefusesAnEmptyNameWithoutTouchingTheLoader)
-{
-    PluginManager manager;
-    LogCapture log(5);
-    PluginModule module;
-    EXPECT_EQ(JEX_FAILURE, manager.loadModule("", PluginTree::builtModule("test_counting_alpha").string(), module));
-    EXPECT_TRUE(log.has("PluginManager::loadModule() - Invalid library\n"));
-    EXPECT_FALSE(log.has("PluginManager::unloadModule() - Nothing to unload\n"));
-    EXPECT_FALSE(module.handle.isLoaded());
-    EXPECT_TRUE(module.libraryPath.empty());
-    EXPECT_TRUE(entries.lines().empty());
-}
-
-TEST_F(PluginManagerTest, AModuleThatCannotBeLoadedIsReportedThenNothingIsUnloaded)
+TEST_F(PluginManagerTest, AnEmptyNameOrAnUnloadableModuleIsRefused)
 {
     PluginManager manager;
     PluginModule module;
     {
-        LogCapture log(2);
-        EXPECT_EQ(JEX_FAILURE, manager.loadModule("ghost", root() + "/nowhere/ghost.so", module));
-        EXPECT_TRUE(log.has("PluginManager::loadModule(ghost) - Failed loading module\n"));
+        // An empty name never reaches the loader.
+        LogCapture log(5);
+        EXPECT_EQ(JEX_FAILURE, manager.loadModule("", PluginTree::builtModule("test_counting_alpha").string(), module));
+        EXPECT_TRUE(log.has("PluginManager::loadModule() - Invalid library\n"));
         EXPECT_FALSE(log.has("PluginManager::unloadModule() - Nothing to unload\n"));
+        EXPECT_FALSE(module.handle.isLoaded());
+        EXPECT_TRUE(module.libraryPath.empty());
+        EXPECT_TRUE(entries.lines().empty());
     }
+    // A module that cannot be loaded is reported (level 2), then nothing is
+    // unloaded (level 3, on the next line).
     LogCapture log(3);
     EXPECT_EQ(JEX_FAILURE, manager.loadModule("ghost", root() + "/nowhere/ghost.so", module));
     const Lines lines = log.lines();
-    const auto failed = position(lines, "PluginManager::loadModule(ghost) - Failed loading module\n");
-    ASSERT_GE(failed, 0);
-    EXPECT_EQ(failed + 1, position(lines, "PluginManager::unloadModule() - Nothing to unload\n"));
+    const auto failed = std::find(lines.begin(), lines.end(), "PluginManager::loadModule(ghost) - Failed loading module\n");
+    ASSERT_NE(lines.end(), failed);
+    ASSERT_NE(lines.end(), failed + 1);
+    EXPECT_EQ("PluginManager::unloadModule() - Nothing to unload\n", *(failed + 1));
+    LogCapture level2(2);
+    EXPECT_EQ(JEX_FAILURE, manager.loadModule("ghost", root() + "/nowhere/ghost.so", module));
+    EXPECT_TRUE(level2.has("PluginManager::loadModule(ghost) - Failed loading module\n"));
+    EXPECT_FALSE(level2.has("PluginManager::unloadModule() - Nothing to unload\n"));
 }
 
 TEST_F(PluginManagerTest, AModuleLackingAnyEntryPointIsRefusedAndFreedAgain)
@@ -136,17 +128,6 @@ TEST_F(PluginManagerTest, ALoadedModuleIsToldLoadedThenGetsTheCompleteCallbackTa
     EXPECT_EQ(1u, entries.count("alpha unloaded"));
 }
 
-TEST_F(PluginManagerTest, AnEmptyTreeGivesOneSearchLineAndNoTargets)
-{
-    LogCapture log(3);
-    PluginManager manager;
-    EXPECT_EQ(root(), manager.getPluginRoot());
-    EXPECT_EQ((Lines {"PluginManager::addAllPlugins() - Searching for Company Directories in: " + root() + "\n"}),
-              discoveryLines(log));
-    EXPECT_EQ(0u, manager.getTargetCount());
-    EXPECT_EQ(JEX_FAILURE, manager.addAllPlugins());
-}
-
 TEST_F(PluginManagerTest, DiscoveryWalksTwoLevelsAndLoadsOnlyDescribedPlugins)
 {
     testsupport::writeFile(env.pluginRoot() / "README", "not a company");
@@ -159,7 +140,7 @@ TEST_F(PluginManagerTest, DiscoveryWalksTwoLevelsAndLoadsOnlyDescribedPlugins)
     LogCapture log(3);
     PluginManager manager;
     const std::string acme = root() + "/acme";
-    const std::string prefix = "PluginManager::addAllPlugins() - ";
+    const std::string& prefix = kDiscovery;
     EXPECT_EQ((Lines {
                   prefix + "Searching for Company Directories in: " + root() + "\n",
                   prefix + "Found " + root() + "/README, isDir? No\n",
@@ -189,9 +170,8 @@ TEST_F(PluginManagerTest, RefreshAddsOnlyNewPluginsAndKeepsIndices)
     {
         LogCapture log(3);
         EXPECT_EQ(JEX_FAILURE, manager.refreshTargetList());
-        EXPECT_EQ(1u, log.count("PluginManager::addAllPlugins() - alpha is already loaded!\n"));
-        EXPECT_FALSE(log.has("PluginManager::addAllPlugins() - Valid Plugin xml found: " +
-                             tree.xmlPath("acme", "alpha") + "\n"));
+        EXPECT_EQ(1u, log.count(kDiscovery + "alpha is already loaded!\n"));
+        EXPECT_FALSE(log.has(kDiscovery + "Valid Plugin xml found: " + tree.xmlPath("acme", "alpha") + "\n"));
     }
     EXPECT_EQ(2u, manager.getTargetCount());
 
@@ -216,9 +196,7 @@ TEST_F(PluginManagerTest, AFailingPluginIsTriedAgainAtEveryDiscoveryAndNeverList
     LogCapture log(3);
     PluginManager manager;
     EXPECT_EQ(JEX_FAILURE, manager.refreshTargetList());
-    const std::string valid =
-        "PluginManager::addAllPlugins() - Valid Plugin xml found: " + tree.xmlPath("acme", "broken") + "\n";
-    EXPECT_EQ(2u, log.count(valid));
+    EXPECT_EQ(2u, log.count(kDiscovery + "Valid Plugin xml found: " + tree.xmlPath("acme", "broken") + "\n"));
     EXPECT_EQ(2u, log.count("PluginManager::loadModule(broken) - Not all required functions were implemented in "
                             "plugin\n"));
     EXPECT_EQ(0u, manager.getTargetCount());
@@ -316,22 +294,16 @@ TEST_F(PluginManagerTest, TheDescriptionIsTheDescriptorFileReadAtEachCall)
     ASSERT_EQ(2u, manager.getTargetCount());
 
     EXPECT_EQ(121u, manager.getXMLSizeByIndex(0));
-    {
+    // Exactly the room needed, then a cut text: read count 1 either way.
+    for (const auto& [index, size] : {std::pair {0u, 121u}, {1u, 10u}}) {
         LogCapture log(2);
-        const Target whole = targetAt(manager, 0, 121);
-        EXPECT_EQ(JEX_SUCCESS, whole.status);
-        EXPECT_EQ(text, whole.xml);
+        const Target t = targetAt(manager, index, size);
+        EXPECT_EQ(JEX_SUCCESS, t.status);
+        EXPECT_EQ(text.substr(0, size - 1), t.xml);
         EXPECT_TRUE(log.has("PluginManager::getTargetByIndex() - readCount=1\n"));
     }
-    {
-        LogCapture log(2);
-        const Target cut = targetAt(manager, 1, 10);
-        EXPECT_EQ(JEX_SUCCESS, cut.status);
-        EXPECT_EQ(text.substr(0, 9), cut.xml);
-        EXPECT_EQ("two", cut.type);
-        EXPECT_EQ("alpha", cut.plugin);
-        EXPECT_TRUE(log.has("PluginManager::getTargetByIndex() - readCount=1\n"));
-    }
+    EXPECT_EQ("two", targetAt(manager, 1, 10).type);
+    EXPECT_EQ("alpha", targetAt(manager, 1, 10).plugin);
     {
         // More room than needed: the whole text, the rest zero, read count 0.
         LogCapture log(2);
@@ -342,13 +314,11 @@ TEST_F(PluginManagerTest, TheDescriptionIsTheDescriptorFileReadAtEachCall)
         EXPECT_TRUE(std::all_of(buf.begin() + 120, buf.end(), [](char c) { return c == '\0'; }));
         EXPECT_TRUE(log.has("PluginManager::getTargetByIndex() - readCount=0\n"));
     }
-    {
-        // A one-byte buffer holds just the terminating zero.
-        char one = 'x';
-        std::string type, plugin;
-        EXPECT_EQ(JEX_SUCCESS, manager.getTargetByIndex(0, &one, 1, &type, &plugin));
-        EXPECT_EQ('\0', one);
-    }
+    // A one-byte buffer holds just the terminating zero.
+    char one = 'x';
+    std::string type = "old", plugin = "old";
+    EXPECT_EQ(JEX_SUCCESS, manager.getTargetByIndex(0, &one, 1, &type, &plugin));
+    EXPECT_EQ('\0', one);
 
     // Changed on disk: the new text; the list stays as discovered.
     tree.addDescriptor("acme", "alpha", PluginTree::descriptor({"three"}));
@@ -361,17 +331,22 @@ TEST_F(PluginManagerTest, TheDescriptionIsTheDescriptorFileReadAtEachCall)
     fs::remove(tree.xmlPath("acme", "alpha"));
     EXPECT_EQ(0u, manager.getXMLSizeByIndex(0));
     char buf[16] = "untouched";
-    std::string type = "old", plugin = "old";
+    type = "old";
     EXPECT_EQ(JEX_FAILURE, manager.getTargetByIndex(0, buf, sizeof buf, &type, &plugin));
     EXPECT_STREQ("untouched", buf);
     EXPECT_EQ("old", type);
     EXPECT_EQ(2u, manager.getTargetCount());
 }
 
-TEST_F(PluginManagerTest, IndexOperationsRefuseBadArguments)
+TEST_F(PluginManagerTest, AnEmptyTreeListsNothingAndIndexOperationsRefuseBadArguments)
 {
+    LogCapture log(3);
     PluginManager manager;
-    LogCapture log(1);
+    EXPECT_EQ(root(), manager.getPluginRoot());
+    EXPECT_EQ((Lines {kDiscovery + "Searching for Company Directories in: " + root() + "\n"}), discoveryLines(log));
+    EXPECT_EQ(0u, manager.getTargetCount());
+    EXPECT_EQ(JEX_FAILURE, manager.addAllPlugins());
+
     EXPECT_EQ(0u, manager.getXMLSizeByIndex(0));
     EXPECT_TRUE(log.has("PluginManager::getXMLSizeByIndex() - Invalid argument\n"));
     char buf[8];

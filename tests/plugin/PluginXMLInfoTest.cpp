@@ -109,23 +109,17 @@ TEST(PluginXMLInfo, ParsingIsTracedAtLevelFive)
 
 TEST(PluginXMLInfo, UnreadableDescriptorsAreReportedAtLevelFive)
 {
+    // A missing file, and a directory where the descriptor should be.
     testsupport::TempDir dir;
-    const std::string missing = (dir / "absent.xml").string();
-    {
+    fs::create_directories(dir / "dir.xml");
+    for (const std::string& path : {(dir / "absent.xml").string(), (dir / "dir.xml").string()}) {
         LogCapture log(5);
         Names names {"left over"};
-        EXPECT_EQ(JEX_FAILURE, JexRT::getPluginXMLInfo(missing, names));
+        EXPECT_EQ(JEX_FAILURE, JexRT::getPluginXMLInfo(path, names));
         EXPECT_TRUE(names.empty());
-        EXPECT_TRUE(log.has("getPluginXMLInfo - Cannot open xml file: " + missing + "\n"));
-        EXPECT_FALSE(log.has("getPluginXMLInfo - Attempting to parse " + missing + "\n"));
+        EXPECT_TRUE(log.has("getPluginXMLInfo - Cannot open xml file: " + path + "\n"));
+        EXPECT_FALSE(log.has("getPluginXMLInfo - Attempting to parse " + path + "\n"));
     }
-    // A directory where the descriptor should be cannot be opened either.
-    const std::string directory = (dir / "dir.xml").string();
-    fs::create_directories(directory);
-    LogCapture log(5);
-    Names names;
-    EXPECT_EQ(JEX_FAILURE, JexRT::getPluginXMLInfo(directory, names));
-    EXPECT_TRUE(log.has("getPluginXMLInfo - Cannot open xml file: " + directory + "\n"));
 }
 
 TEST(PluginXMLInfo, EveryCallRunsItsOwnParserCycle)

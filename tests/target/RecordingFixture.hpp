@@ -7,7 +7,10 @@
 
 #include <cstdint>
 #include <cstdio>
+#include <algorithm>
+#include <bitset>
 #include <filesystem>
+#include <sstream>
 #include <string>
 #include <vector>
 
@@ -28,7 +31,6 @@ inline std::vector<Message>& messages()
     static std::vector<Message> list;
     return list;
 }
-
 inline void keepMessage(unsigned handle, unsigned type, const char* text)
 {
     messages().push_back({handle, type, text ? text : ""});
@@ -73,10 +75,7 @@ protected:
             std::filesystem::copy_file(from / (module + ext), to / (module + ext),
                                        std::filesystem::copy_options::overwrite_existing);
     }
-    void removeModule(const std::string& module)
-    {
-        std::filesystem::remove_all(m_env.pluginRoot() / "JexTests" / module);
-    }
+    void removeModule(const std::string& module) { std::filesystem::remove_all(m_env.pluginRoot() / "JexTests" / module); }
 
     // The plug-in's configuration for instances created from now on.
     void configure(const std::string& config) { setenv(recording::kConfigVariable, config.c_str(), 1); }
@@ -110,14 +109,8 @@ protected:
     std::vector<std::string> record() const
     {
         std::vector<std::string> lines;
-        const std::string text = testsupport::readFile(m_env.root() / "record.txt");
-        size_t pos = 0;
-        while (pos < text.size()) {
-            size_t end = text.find('\n', pos);
-            if (end == std::string::npos) end = text.size();
-            lines.push_back(text.substr(pos, end - pos));
-            pos = end + 1;
-        }
+        std::istringstream in(testsupport::readFile(m_env.root() / "record.txt"));
+        for (std::string line; std::getline(in, line);) lines.push_back(line);
         return lines;
     }
     // The lines of RecordingPlugin without its prefix, leaving out the
@@ -127,11 +120,10 @@ protected:
         std::vector<std::string> out;
         const std::string prefix = "RecordingPlugin: ";
         for (const std::string& line : record()) {
-            if (line.compare(0, prefix.size(), prefix) != 0) continue;
-            const std::string call = line.substr(prefix.size());
-            if (call == "JexPlugin_loaded" || call == "JexPlugin_setCallbacks" || call == "JexPlugin_unloaded")
-                continue;
-            out.push_back(call);
+            const std::string call = line.substr(std::min(line.size(), prefix.size()));
+            if (line.compare(0, prefix.size(), prefix) == 0 && call != "JexPlugin_loaded" &&
+                call != "JexPlugin_setCallbacks" && call != "JexPlugin_unloaded")
+                out.push_back(call);
         }
         return out;
     }
@@ -146,11 +138,6 @@ protected:
 };
 
 // The 32-character '0'/'1' text of code, bit 31 first.
-inline std::string bits(unsigned code)
-{
-    std::string text;
-    for (int bit = 31; bit >= 0; --bit) text += ((code >> bit) & 1u) ? '1' : '0';
-    return text;
-}
+inline std::string bits(unsigned code) { return std::bitset<32>(code).to_string(); }
 
 } // namespace targettest

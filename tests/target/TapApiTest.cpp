@@ -21,10 +21,6 @@ struct Buffers {
     unsigned char tdo[4] = {};
     unsigned char tdiMask[4] = {0xFF, 0xFF, 0xFF, 0xFF};
     unsigned char tdoMask[4] = {0x0F, 0x0F, 0x0F, 0x0F};
-    std::string tdiText() const { return pointerText(tdi); }
-    std::string tdoText() const { return pointerText(tdo); }
-    std::string tdiMaskText() const { return pointerText(tdiMask); }
-    std::string tdoMaskText() const { return pointerText(tdoMask); }
 };
 
 using ShiftFn = uint32_t (*)(unsigned handle, unsigned deviceIndex, unsigned shiftMode, unsigned exitState,
@@ -76,15 +72,14 @@ TEST_F(TapApiTest, ShiftModeSelectsOnePluginOperationWithArgumentsInOrder)
         EXPECT_EQ(JEX_SUCCESS, s.call(h, 2, 7, JEXJTAG_PAUSE_IR, callerData, 5, b.tdi, b.tdo, b.tdiMask, b.tdoMask));
         EXPECT_EQ(JEX_FAILURE, s.call(h, 2, 4, JEXJTAG_PAUSE_IR, callerData, 5, b.tdi, b.tdo, b.tdiMask, b.tdoMask));
 
+        const std::string tdi = "tdi=" + pointerText(b.tdi), tdo = "tdo=" + pointerText(b.tdo);
+        const std::string tdiMask = " tdiMask=" + pointerText(b.tdiMask), tdoMask = " tdoMask=" + pointerText(b.tdoMask);
+        const std::string rw = std::string(s.name) + "ReadWrite " + dev + tdi + " " + tdo + tdiMask + tdoMask;
         const std::vector<std::string> expected = {
-            std::string(s.name) + "ReadWrite " + dev + "tdi=" + b.tdiText() + " tdo=" + b.tdoText() +
-                " tdiMask=" + b.tdiMaskText() + " tdoMask=" + b.tdoMaskText() + " bitCount=27 exitState=6" + ctx,
-            std::string(s.name) + "Read " + dev + "tdiLevel=1 tdo=" + b.tdoText() + " tdoMask=" + b.tdoMaskText() +
-                " bitCount=8 exitState=1" + ctx,
-            std::string(s.name) + "Write " + dev + "tdi=" + b.tdiText() + " tdiMask=" + b.tdiMaskText() +
-                " bitCount=9 exitState=15" + ctx,
-            std::string(s.name) + "ReadWrite " + dev + "tdi=" + b.tdiText() + " tdo=" + b.tdoText() +
-                " tdiMask=" + b.tdiMaskText() + " tdoMask=" + b.tdoMaskText() + " bitCount=5 exitState=13" + ctx,
+            rw + " bitCount=27 exitState=6" + ctx,
+            std::string(s.name) + "Read " + dev + "tdiLevel=1 " + tdo + tdoMask + " bitCount=8 exitState=1" + ctx,
+            std::string(s.name) + "Write " + dev + tdi + tdiMask + " bitCount=9 exitState=15" + ctx,
+            rw + " bitCount=5 exitState=13" + ctx,
         };
         EXPECT_EQ(expected, calls());
     }
@@ -160,20 +155,55 @@ TEST_F(TapApiTest, ShiftTracesAndDumpsFollowTheMode)
     const unsigned h = openTarget();
     const std::string hs = std::to_string(h);
     Buffers b;
-    LogCapture log(5);
-    EXPECT_EQ(JEX_SUCCESS, JexJtag_tap_shiftDeviceIR(h, 1, JEXJTAG_SHIFT_READWRITE, JEXJTAG_UPDATE_IR, nullptr, 12,
-                                                     b.tdi, b.tdo, nullptr, b.tdoMask));
-    EXPECT_TRUE(log.has("JexJtag_tap_shiftDeviceIR() handle=" + hs + ", deviceIndex=1, bitCount=12\n"));
-    EXPECT_TRUE(log.has("JexJtag_tap_shiftDeviceIR() shiftMode=JEXJTAG_SHIFT_READWRITE\n"));
-    EXPECT_TRUE(log.has("JexJtag_tap_shiftDeviceIR() exitState=JEXJTAG_UPDATE_IR\n"));
-    EXPECT_TRUE(log.has("shiftDeviceIR(deviceIndex=1, tdibuf=" + tracedPointer(b.tdi) + ", tdobuf=" +
-                        tracedPointer(b.tdo) + ", tdimask=NULL, tdomask=" + tracedPointer(b.tdoMask) +
-                        ", bitCount=12, shiftMode=RW, exitState=JEXJTAG_UPDATE_IR) returning JEX_SUCCESS\n"));
-    const std::string text = log.text();
-    EXPECT_NE(std::string::npos, text.find("TDI BUFFER BEFORE SHIFTDEVICEIR:"));
-    EXPECT_NE(std::string::npos, text.find("TDO BUFFER AFTER SHIFTDEVICEIR:"));
-    EXPECT_NE(std::string::npos, text.find(" 80 11\n")); // 12 bits: two bytes of TDI
-    EXPECT_NE(std::string::npos, text.find(" 5A 5A\n"));
+    {
+        LogCapture log(5);
+        EXPECT_EQ(JEX_SUCCESS, JexJtag_tap_shiftDeviceIR(h, 1, JEXJTAG_SHIFT_READWRITE, JEXJTAG_UPDATE_IR, nullptr, 12,
+                                                         b.tdi, b.tdo, nullptr, b.tdoMask));
+        EXPECT_TRUE(log.has("JexJtag_tap_shiftDeviceIR() handle=" + hs + ", deviceIndex=1, bitCount=12\n"));
+        EXPECT_TRUE(log.has("JexJtag_tap_shiftDeviceIR() shiftMode=JEXJTAG_SHIFT_READWRITE\n"));
+        EXPECT_TRUE(log.has("JexJtag_tap_shiftDeviceIR() exitState=JEXJTAG_UPDATE_IR\n"));
+        EXPECT_TRUE(log.has("shiftDeviceIR(deviceIndex=1, tdibuf=" + tracedPointer(b.tdi) + ", tdobuf=" +
+                            tracedPointer(b.tdo) + ", tdimask=NULL, tdomask=" + tracedPointer(b.tdoMask) +
+                            ", bitCount=12, shiftMode=RW, exitState=JEXJTAG_UPDATE_IR) returning JEX_SUCCESS\n"));
+        const std::string text = log.text();
+        EXPECT_NE(std::string::npos, text.find("TDI BUFFER BEFORE SHIFTDEVICEIR:"));
+        EXPECT_NE(std::string::npos, text.find("TDO BUFFER AFTER SHIFTDEVICEIR:"));
+        EXPECT_NE(std::string::npos, text.find(" 80 11\n")); // 12 bits: two bytes of TDI
+        EXPECT_NE(std::string::npos, text.find(" 5A 5A\n"));
+    }
+    clearRecord();
+    {
+        // Read only: no TDI dump.
+        LogCapture log(5);
+        EXPECT_EQ(JEX_SUCCESS, JexJtag_tap_shiftChainIR(h, JEXJTAG_SHIFT_READ, 1, nullptr, 8, b.tdi, b.tdo, nullptr,
+                                                        nullptr));
+        EXPECT_EQ(std::string::npos, log.text().find("TDI BUFFER"));
+        EXPECT_NE(std::string::npos, log.text().find("TDO BUFFER AFTER SHIFTCHAINIR:"));
+        EXPECT_NE(std::string::npos, log.text().find("shiftMode=R, exitState=JEXJTAG_RUN_TEST_IDLE) returning"));
+    }
+    {
+        // Write only: no TDO dump.
+        LogCapture log(5);
+        EXPECT_EQ(JEX_SUCCESS, JexJtag_tap_shiftChainDR(h, JEXJTAG_SHIFT_WRITE, 1, nullptr, 8, b.tdi, b.tdo, nullptr,
+                                                        nullptr));
+        EXPECT_EQ(std::string::npos, log.text().find("TDO BUFFER"));
+        EXPECT_NE(std::string::npos, log.text().find("TDI BUFFER BEFORE SHIFTCHAINDR:"));
+    }
+    {
+        // No mode bit: the full trace line, an empty mode text, no call.
+        LogCapture log(3);
+        EXPECT_EQ(JEX_FAILURE, JexJtag_tap_shiftChainDR(h, 0, 99, nullptr, 8, b.tdi, b.tdo, nullptr, nullptr));
+        EXPECT_TRUE(log.has("JexJtag_tap_shiftChainDR() shiftMode=unknown(0)\n"));
+        EXPECT_TRUE(log.has("JexJtag_tap_shiftChainDR() exitState=unknown(99)\n"));
+        EXPECT_NE(std::string::npos,
+                  log.text().find("bitCount=8, shiftMode=, exitState=unknown(99)) returning JEX_FAILURE\n"));
+    }
+    const std::vector<std::string> got = calls();
+    ASSERT_EQ(2u, got.size());
+    // The write-only call hands the plug-in no TDO buffer or mask.
+    EXPECT_EQ("shiftChainDRWrite tdi=" + pointerText(b.tdi) + " tdiMask=null bitCount=8 exitState=1 handle=" + hs +
+                  " callerData=null",
+              got[1]);
 }
 
 TEST_F(TapApiTest, AMegabitShiftIsDumpedWholeAtLevelFive)
@@ -205,42 +235,6 @@ TEST_F(TapApiTest, AMegabitShiftIsDumpedWholeAtLevelFive)
     EXPECT_TRUE(log.has("shiftChainDR(tdibuf=" + tracedPointer(tdi.data()) + ", tdobuf=" + tracedPointer(tdo.data()) +
                         ", tdimask=NULL, tdomask=NULL, bitCount=1048576, shiftMode=RW, "
                         "exitState=JEXJTAG_RUN_TEST_IDLE) returning JEX_SUCCESS\n"));
-}
-
-TEST_F(TapApiTest, ReadOnlyDumpsNoTdiAndWriteOnlyNoTdo)
-{
-    const unsigned h = openTarget();
-    Buffers b;
-    {
-        LogCapture log(5);
-        EXPECT_EQ(JEX_SUCCESS, JexJtag_tap_shiftChainIR(h, JEXJTAG_SHIFT_READ, 1, nullptr, 8, b.tdi, b.tdo, nullptr,
-                                                        nullptr));
-        EXPECT_EQ(std::string::npos, log.text().find("TDI BUFFER"));
-        EXPECT_NE(std::string::npos, log.text().find("TDO BUFFER AFTER SHIFTCHAINIR:"));
-        EXPECT_NE(std::string::npos, log.text().find("shiftMode=R, exitState=JEXJTAG_RUN_TEST_IDLE) returning"));
-    }
-    {
-        LogCapture log(5);
-        EXPECT_EQ(JEX_SUCCESS, JexJtag_tap_shiftChainDR(h, JEXJTAG_SHIFT_WRITE, 1, nullptr, 8, b.tdi, b.tdo, nullptr,
-                                                        nullptr));
-        EXPECT_EQ(std::string::npos, log.text().find("TDO BUFFER"));
-        EXPECT_NE(std::string::npos, log.text().find("TDI BUFFER BEFORE SHIFTCHAINDR:"));
-    }
-    {
-        // No mode bit: the full trace line, an empty mode text, no call.
-        LogCapture log(3);
-        EXPECT_EQ(JEX_FAILURE, JexJtag_tap_shiftChainDR(h, 0, 99, nullptr, 8, b.tdi, b.tdo, nullptr, nullptr));
-        EXPECT_TRUE(log.has("JexJtag_tap_shiftChainDR() shiftMode=unknown(0)\n"));
-        EXPECT_TRUE(log.has("JexJtag_tap_shiftChainDR() exitState=unknown(99)\n"));
-        EXPECT_NE(std::string::npos,
-                  log.text().find("bitCount=8, shiftMode=, exitState=unknown(99)) returning JEX_FAILURE\n"));
-    }
-    const std::vector<std::string> got = calls();
-    ASSERT_EQ(2u, got.size());
-    // The write-only call hands the plug-in no TDO buffer or mask.
-    EXPECT_EQ("shiftChainDRWrite tdi=" + b.tdiText() + " tdiMask=null bitCount=8 exitState=1 handle=" +
-                  std::to_string(h) + " callerData=null",
-              got[1]);
 }
 
 TEST_F(TapApiTest, ChainValuesAreReadAndSetThroughThePlugin)
@@ -345,6 +339,13 @@ TEST_F(TapApiTest, AutodetectStopsWhenInterrogationFailsAndIgnoresRefusedLengths
     const unsigned h = openTarget({"devices=11111111:5", "fail=interrogate"});
     EXPECT_EQ(JEX_FAILURE, JexJtag_tap_autodetectChain(h, JEXJTAG_SCAN_DEFAULT));
     EXPECT_EQ(std::vector<std::string>{"interrogate"}, calls());
+    // Interrogating alone ignores the algorithm and answers what the plug-in does.
+    {
+        LogCapture log(3);
+        EXPECT_EQ(JEX_FAILURE, JexJtag_tap_interrogateChain(h, 9));
+        EXPECT_TRUE(log.has("JexJtag_tap_interrogateChain() handle=" + std::to_string(h) + ", algorithm=9\n"));
+        EXPECT_TRUE(log.has("interrogate() returning JEX_FAILURE\n"));
+    }
     JexJtag_target_close(h);
 
     EXPECT_EQ(JEX_SUCCESS, open("recording", {"devices=11111111:5", "fail=setIRLength"}));
@@ -357,20 +358,8 @@ TEST_F(TapApiTest, AutodetectStopsWhenInterrogationFailsAndIgnoresRefusedLengths
     EXPECT_EQ(JEX_SUCCESS, open("recording"));
     clearRecord();
     EXPECT_EQ(JEX_SUCCESS, JexJtag_tap_autodetectChain(h, JEXJTAG_SCAN_TLRSHIFT));
-    EXPECT_EQ((std::vector<std::string>{"interrogate", "getDeviceCount"}), calls());
-}
-
-TEST_F(TapApiTest, InterrogateIgnoresTheAlgorithm)
-{
-    const unsigned h = openTarget();
-    LogCapture log(3);
     EXPECT_EQ(JEX_SUCCESS, JexJtag_tap_interrogateChain(h, JEXJTAG_SCAN_DEFAULT));
-    EXPECT_EQ(JEX_SUCCESS, JexJtag_tap_interrogateChain(h, 9));
-    EXPECT_EQ((std::vector<std::string>{"interrogate", "interrogate"}), calls());
-    const std::string hs = std::to_string(h);
-    EXPECT_TRUE(log.has("JexJtag_tap_interrogateChain() handle=" + hs + ", algorithm=JEXJTAG_SCAN_DEFAULT\n"));
-    EXPECT_TRUE(log.has("JexJtag_tap_interrogateChain() handle=" + hs + ", algorithm=9\n"));
-    EXPECT_EQ(2u, log.count("interrogate() returning JEX_SUCCESS\n"));
+    EXPECT_EQ((std::vector<std::string>{"interrogate", "getDeviceCount", "interrogate"}), calls());
 }
 
 TEST_F(TapApiTest, EveryTapFunctionFailsWithoutATarget)

@@ -194,53 +194,36 @@ TEST_F(TargetApiTest, OptionsTravelAsGetAndSetCommands)
 
 TEST_F(TargetApiTest, GetOptionStaysWithinTheCallersCapacity)
 {
-    // The plug-in reports the length of the text it wrote: a text that fits
-    // comes back whole.
-    unsigned h = openTarget({"option.name=abcdef", "optlen=text"});
-    char value[16];
-    std::memset(value, 'x', sizeof value);
-    unsigned size = 7;
-    EXPECT_EQ(JEX_SUCCESS, JexJtag_target_getOption(h, "name", value, &size));
-    EXPECT_STREQ("abcdef", value);
-    EXPECT_EQ(6u, size);
-    EXPECT_EQ('x', value[7]);
-
-    // A longer text is cut to capacity - 1 characters and a NUL.
-    std::memset(value, 'x', sizeof value);
-    size = 4;
-    EXPECT_EQ(JEX_SUCCESS, JexJtag_target_getOption(h, "name", value, &size));
-    EXPECT_STREQ("abc", value);
-    EXPECT_EQ('x', value[4]);
-    EXPECT_EQ(3u, size); // all this plug-in tells
-    JexJtag_target_close(h);
-
-    // A plug-in that reports the full length: nothing is written past the
-    // capacity, and the caller learns the length to retry with.
-    EXPECT_EQ(JEX_SUCCESS, open("recording", {"option.name=abcdefghijkl", "optlen=full"}));
-    std::memset(value, 'x', sizeof value);
-    size = 4;
-    EXPECT_EQ(JEX_SUCCESS, JexJtag_target_getOption(h, "name", value, &size));
-    EXPECT_STREQ("abc", value);
-    EXPECT_EQ(std::string(12, 'x'), std::string(value + 4, 12));
-    EXPECT_EQ(12u, size);
-    size = 13;
-    EXPECT_EQ(JEX_SUCCESS, JexJtag_target_getOption(h, "name", value, &size));
-    EXPECT_STREQ("abcdefghijkl", value);
-    EXPECT_EQ(12u, size);
-    JexJtag_target_close(h);
-
-    // A plug-in that leaves the word alone: a cut text reports the capacity,
-    // which still tells the caller to retry larger.
-    EXPECT_EQ(JEX_SUCCESS, open("recording", {"option.name=abcdefghijkl", "optlen=keep"}));
-    size = 5;
-    EXPECT_EQ(JEX_SUCCESS, JexJtag_target_getOption(h, "name", value, &size));
-    EXPECT_STREQ("abcd", value);
-    EXPECT_EQ(5u, size);
-    size = 64;
-    char big[64];
-    EXPECT_EQ(JEX_SUCCESS, JexJtag_target_getOption(h, "name", big, &size));
-    EXPECT_STREQ("abcdefghijkl", big);
-    EXPECT_EQ(12u, size);
+    // What the plug-in leaves in the length word: the length of the text it
+    // wrote, the option's full length, or the capacity untouched.  A cut text
+    // is capacity - 1 characters and a NUL; nothing is written past the
+    // capacity, and the word tells the caller whether to retry larger.
+    struct Case {
+        const char* optlen;
+        const char* value;
+        unsigned capacity;
+        const char* text;
+        unsigned size;
+    };
+    const Case cases[] = {
+        {"text", "abcdef", 7, "abcdef", 6},        {"text", "abcdef", 4, "abc", 3},
+        {"full", "abcdefghijkl", 4, "abc", 12},    {"full", "abcdefghijkl", 13, "abcdefghijkl", 12},
+        {"keep", "abcdefghijkl", 5, "abcd", 5},    {"keep", "abcdefghijkl", 64, "abcdefghijkl", 12},
+    };
+    const unsigned h = createSession();
+    for (const Case& c : cases) {
+        SCOPED_TRACE(std::string(c.optlen) + " " + std::to_string(c.capacity));
+        const std::string option = std::string("option.name=") + c.value, optlen = std::string("optlen=") + c.optlen;
+        ASSERT_EQ(JEX_SUCCESS, open("recording", {option.c_str(), optlen.c_str()}));
+        char value[80];
+        std::memset(value, 'x', sizeof value);
+        unsigned size = c.capacity;
+        EXPECT_EQ(JEX_SUCCESS, JexJtag_target_getOption(h, "name", value, &size));
+        EXPECT_STREQ(c.text, value);
+        EXPECT_EQ(c.size, size);
+        EXPECT_EQ(std::string(sizeof value - c.capacity, 'x'), std::string(value + c.capacity, sizeof value - c.capacity));
+        JexJtag_target_close(h);
+    }
 }
 
 TEST_F(TargetApiTest, GetOptionRefusesMissingBuffersAndKeepsValueOnFailure)
@@ -320,7 +303,7 @@ TEST_F(TargetApiTest, PinsWaitingAndFlushReachThePlugin)
     EXPECT_TRUE(log.has("flush() returning JEX_SUCCESS\n"));
 }
 
-TEST_F(TargetApiTest, GetInfoCopiesTheRecordAndTracesEveryField)
+TEST_F(TargetApiTest, GetInfoCopiesTheRecordAndRefusesANullOne)
 {
     const unsigned h = openTarget({"flags=0x6"});
     LogCapture log(3);
@@ -328,16 +311,13 @@ TEST_F(TargetApiTest, GetInfoCopiesTheRecordAndTracesEveryField)
     EXPECT_EQ(JEX_SUCCESS, JexJtag_target_getInfo(h, &info));
     EXPECT_STREQ("Test Vendor", info.vendor);
     EXPECT_EQ(6u, info.target_flags);
-    EXPECT_TRUE(log.has("JexJtag_target_getInfo() returning info {\n"));
-    EXPECT_TRUE(log.has("    vendor=Test Vendor\n"));
     EXPECT_TRUE(log.has("    target_flags=0x6\n"));
-    EXPECT_TRUE(log.has("}\n"));
     // A null record fails although the plug-in answered.
     EXPECT_EQ(JEX_FAILURE, JexJtag_target_getInfo(h, nullptr));
     EXPECT_EQ(2u, calls().size());
 }
 
-TEST_F(TargetApiTest, EveryTargetFunctionFailsWithoutATarget)
+TEST_F(TargetApiTest, EveryTargetAndLockFunctionFailsWithoutATarget)
 {
     const unsigned h = createSession();
     unsigned value = 77;
@@ -354,6 +334,10 @@ TEST_F(TargetApiTest, EveryTargetFunctionFailsWithoutATarget)
     EXPECT_EQ(JEX_FAILURE, JexJtag_target_pulsePin(h, 0, 1));
     EXPECT_EQ(JEX_FAILURE, JexJtag_target_waitTime(h, 1));
     EXPECT_EQ(JEX_FAILURE, JexJtag_target_getInfo(h, &info));
+    EXPECT_EQ(JEX_FAILURE, JexJtag_target_getLockStatus(h, &value));
+    EXPECT_EQ(JEX_FAILURE, JexJtag_target_lock(h, 1, &value));
+    EXPECT_EQ(JEX_FAILURE, JexJtag_target_unlock(h));
+    EXPECT_EQ(JEX_FAILURE, JexJtag_target_getLockStatus(h, nullptr));
     EXPECT_EQ(77u, value);
     EXPECT_EQ(8u, size);
     EXPECT_STREQ("keep", text);

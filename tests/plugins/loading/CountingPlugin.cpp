@@ -35,16 +35,6 @@ public:
         jexTestEntryLog(JEX_TEST_MODULE, "setSessionHandle %u %u", m_id, handle);
         return PluginBase::setSessionHandle(handle);
     }
-    uint32_t openTarget(uint32_t argc, const char** argv, JexJtagCallContext*) override
-    {
-        jexTestEntryLog(JEX_TEST_MODULE, "openTarget %u %s", m_id, argc ? argv[argc - 1] : "");
-        return JEX_SUCCESS;
-    }
-    uint32_t closeTarget() override
-    {
-        jexTestEntryLog(JEX_TEST_MODULE, "closeTarget %u", m_id);
-        return JEX_SUCCESS;
-    }
     uint32_t sendCommand(const char* command, const uint8_t* in, uint32_t inLength, uint8_t*, uint32_t*,
                          JexJtagCallContext*) override
     {

@@ -6,7 +6,6 @@
 // $JEXJTAG_RECORDING_CONFIG ("key=value;key=value") read when an instance is
 // created, then from the open arguments (the same keys, one per argument):
 //
-//   record=0                 record nothing
 //   create=null              JexPlugin_create returns null
 //   fail=op,op               these operations answer JEX_FAILURE
 //   status.<op>=<number>     this operation answers <number>
@@ -16,8 +15,7 @@
 //   optlen=text|full|keep    what "get" leaves in *outLength: the length of
 //                            the text written, the option's full length, or
 //                            the capacity as it was (default text)
-//   pin=<number>             what getPin answers
-//   tdo=<number>             the byte read shifts write into tdo
+//   pin=<number>             what getPin answers (read shifts write 0x5A into tdo)
 //   cmdout=<text>            the answer to any other command
 
 #include <cstdarg>
@@ -81,9 +79,8 @@ Config environmentConfig()
     return config;
 }
 
-void appendLine(bool enabled, const char* format, ...)
+void appendLine(const char* format, ...)
 {
-    if (!enabled) return;
     const std::string path = environment(recording::kRecordFileVariable);
     if (path.empty()) return;
     std::FILE* out = std::fopen(path.c_str(), "a");
@@ -96,8 +93,6 @@ void appendLine(bool enabled, const char* format, ...)
     std::fputc('\n', out);
     std::fclose(out);
 }
-
-bool recordingOn() { return environmentConfig().get("record", "1") != "0"; }
 
 struct Device {
     uint32_t idcode;
@@ -179,15 +174,8 @@ public:
         if (info && !JEX_FAILED(result)) {
             std::snprintf(info->target_name, sizeof info->target_name, "%s", m_type.c_str());
             std::snprintf(info->plugin_name, sizeof info->plugin_name, "%s", RECORDING_MODULE_NAME);
-            std::snprintf(info->fw_ver, sizeof info->fw_ver, "1.2");
-            std::snprintf(info->driver_ver, sizeof info->driver_ver, "3.4");
-            std::snprintf(info->plugin_ver, sizeof info->plugin_ver, "5.6");
             std::snprintf(info->vendor, sizeof info->vendor, "Test Vendor");
-            std::snprintf(info->frequency, sizeof info->frequency, "10 MHz");
-            std::snprintf(info->port, sizeof info->port, "usb:1");
-            std::snprintf(info->full_name, sizeof info->full_name, "Recording cable");
             std::snprintf(info->target_uid, sizeof info->target_uid, "UID-42");
-            std::snprintf(info->rawinfo, sizeof info->rawinfo, "raw");
             info->target_flags = static_cast<uint32_t>(m_config.number("flags", 0));
         }
         return result;
@@ -347,12 +335,11 @@ private:
     template <typename... Args>
     void record(const char* format, Args... args)
     {
-        appendLine(m_record, format, args...);
+        appendLine(format, args...);
     }
 
     void configure()
     {
-        m_record = m_config.get("record", "1") != "0";
         m_fail.clear();
         std::stringstream failing(m_config.get("fail"));
         std::string op;
@@ -385,9 +372,9 @@ private:
     }
     static std::string deviceText(uint32_t d) { return "deviceIndex=" + std::to_string(d) + " "; }
 
-    void fillTdo(uint8_t* tdo, uint32_t bitCount) const
+    static void fillTdo(uint8_t* tdo, uint32_t bitCount)
     {
-        if (tdo) std::memset(tdo, static_cast<int>(m_config.number("tdo", 0x5A)), (bitCount + 7u) / 8u);
+        if (tdo) std::memset(tdo, 0x5A, (bitCount + 7u) / 8u);
     }
 
     uint32_t read(const char* op, const char* device, bool level, uint8_t* tdo, const uint8_t* tdoMask,
@@ -416,7 +403,6 @@ private:
     }
 
     Config m_config;
-    bool m_record = true;
     std::vector<std::string> m_fail;
     std::vector<Device> m_devices;
     std::string m_type;
@@ -426,7 +412,7 @@ private:
 
 extern "C" JEXJTAG_PLUGIN_EXPORT JexPluginInstance* JexPlugin_create(void)
 {
-    appendLine(recordingOn(), "JexPlugin_create");
+    appendLine("JexPlugin_create");
     if (environmentConfig().get("create") == "null") return nullptr;
     try {
         return static_cast<JexPluginInstance*>(new RecordingCable());
@@ -437,27 +423,27 @@ extern "C" JEXJTAG_PLUGIN_EXPORT JexPluginInstance* JexPlugin_create(void)
 
 extern "C" JEXJTAG_PLUGIN_EXPORT uint32_t JexPlugin_destroy(JexPluginInstance* instance)
 {
-    appendLine(recordingOn(), "JexPlugin_destroy instance=%s", pointerText(instance).c_str());
+    appendLine("JexPlugin_destroy instance=%s", pointerText(instance).c_str());
     delete jexjtag::PluginBase::from(instance);
     return JEX_SUCCESS;
 }
 
 extern "C" JEXJTAG_PLUGIN_EXPORT uint32_t JexPlugin_loaded(void)
 {
-    appendLine(recordingOn(), "JexPlugin_loaded");
+    appendLine("JexPlugin_loaded");
     return JEX_SUCCESS;
 }
 
 extern "C" JEXJTAG_PLUGIN_EXPORT uint32_t JexPlugin_unloaded(void)
 {
-    appendLine(recordingOn(), "JexPlugin_unloaded");
+    appendLine("JexPlugin_unloaded");
     jexjtag::PluginHost::set(nullptr);
     return JEX_SUCCESS;
 }
 
 extern "C" JEXJTAG_PLUGIN_EXPORT uint32_t JexPlugin_setCallbacks(const JexPluginCallbacks* callbacks)
 {
-    appendLine(recordingOn(), "JexPlugin_setCallbacks");
+    appendLine("JexPlugin_setCallbacks");
     jexjtag::PluginHost::set(callbacks);
     return JEX_SUCCESS;
 }
