@@ -200,8 +200,6 @@ TEST_F(PluginAbi, CommandsGetAndSetOptions)
     JexPluginInstance* i = open();
     EXPECT_EQ(get(i, "chain"), "0x4BA00477:4:idcode=0xE:user=0xA:userbits=35,0x0362D093:6:idcode=0x9,"
                                "0x41111043:8:idcode=0xE0:user=0x32");
-    EXPECT_EQ(set(i, "frequency=1M"), JEX_SUCCESS);
-    EXPECT_EQ(get(i, "frequency"), "1000000");
     EXPECT_EQ(get(i, "colour"), "<failed>");
     EXPECT_EQ(set(i, "noequals"), JEX_FAILURE);
 
