@@ -178,17 +178,6 @@ TEST_F(E2eChainTest, UserRegistersKeepWhatWasWritten)
                                                          nullptr));
         EXPECT_EQ(values[d], valueOf(back, 0, kUserBits[d])) << "device " << d;
     }
-
-    // A read-write scan returns the old contents and leaves the new ones; a
-    // read-only scan leaves what TDI drove (here zeros).
-    const std::vector<uint8_t> next = bitsOf(0x0F0F0F0F0ull, 35);
-    std::vector<uint8_t> old(5, 0);
-    ASSERT_EQ(JEX_SUCCESS, loadInstruction(0, 0xA, 4));
-    ASSERT_EQ(JEX_SUCCESS, JexJtag_tap_shiftDeviceDR(m_handle, 0, JEXJTAG_SHIFT_READWRITE, JEXJTAG_RUN_TEST_IDLE,
-                                                     nullptr, 35, next.data(), old.data(), nullptr, nullptr));
-    EXPECT_EQ(values[0], valueOf(old, 0, 35));
-    EXPECT_EQ(0x0F0F0F0F0ull, readDeviceDR(0, 35));
-    EXPECT_EQ(0u, readDeviceDR(0, 35));
 }
 
 TEST_F(E2eChainTest, WholeChainReadsShowCapturePatternsAndResumeFromPause)

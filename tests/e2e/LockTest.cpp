@@ -41,29 +41,21 @@ void ignoreMessage(unsigned, unsigned, const char*) {}
     for (;;) pause();
 }
 
-// A child process that is killed and reaped at the end of the scope.
-class Child {
-public:
-    explicit Child(pid_t pid) : m_pid(pid) {}
-    ~Child() { kill(); }
-    Child(const Child&) = delete;
-    Child& operator=(const Child&) = delete;
-
-    pid_t pid() const { return m_pid; }
-    // SIGKILL and wait; the wait status, or -1 when there was no child.
-    int kill()
+// A child that is killed and reaped at the end of the scope, also when an
+// assertion leaves the test early.  reap() gives the wait status.
+struct Child {
+    pid_t pid;
+    ~Child() { reap(); }
+    int reap()
     {
-        if (m_pid <= 0) return -1;
-        ::kill(m_pid, SIGKILL);
         int status = 0;
-        while (waitpid(m_pid, &status, 0) < 0 && errno == EINTR) {
+        if (pid <= 0) return -1;
+        ::kill(pid, SIGKILL);
+        while (waitpid(pid, &status, 0) < 0 && errno == EINTR) {
         }
-        m_pid = -1;
+        pid = -1;
         return status;
     }
-
-private:
-    pid_t m_pid;
 };
 
 // One byte from fd within timeoutMs; '\0' when none came.
@@ -88,7 +80,7 @@ TEST_F(E2eLockTest, AnotherProcessHoldsThePortUntilItIsKilled)
         holdLockUntilKilled(pipeFds[1], m_port);
     }
     close(pipeFds[1]);
-    Child child(pid);
+    Child child{pid};
     const char verdict = readByte(pipeFds[0], 30000);
     close(pipeFds[0]);
     ASSERT_EQ('L', verdict) << "the child could not take the lock";
@@ -104,7 +96,7 @@ TEST_F(E2eLockTest, AnotherProcessHoldsThePortUntilItIsKilled)
               errors[0]);
 
     // The kernel drops the dead holder's lock; its lock file stays behind.
-    const int waitStatus = child.kill();
+    const int waitStatus = child.reap();
     ASSERT_TRUE(WIFSIGNALED(waitStatus));
     EXPECT_EQ(SIGKILL, WTERMSIG(waitStatus));
     EXPECT_TRUE(std::filesystem::exists(m_dir / "locks" / (m_port + ".lock")));

@@ -10,6 +10,7 @@
 
 #include <cstdint>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include "jexjtag/jexjtag.h"
@@ -17,29 +18,20 @@
 
 namespace e2e {
 
-struct Message {
-    unsigned handle;
-    unsigned type;
-    std::string text;
-};
-
-inline std::vector<Message>& messages()
+// The session's messages: (type, text) in order.
+inline std::vector<std::pair<unsigned, std::string>>& messages()
 {
-    static std::vector<Message> list;
+    static std::vector<std::pair<unsigned, std::string>> list;
     return list;
 }
 
-inline void keepMessage(unsigned handle, unsigned type, const char* text)
-{
-    messages().push_back({handle, type, text ? text : ""});
-}
+inline void keepMessage(unsigned, unsigned type, const char* text) { messages().emplace_back(type, text ? text : ""); }
 
-// The messages of one type, in order.
 inline std::vector<std::string> messagesOfType(unsigned type)
 {
     std::vector<std::string> out;
-    for (const Message& m : messages())
-        if (m.type == type) out.push_back(m.text);
+    for (const auto& [t, text] : messages())
+        if (t == type) out.push_back(text);
     return out;
 }
 

@@ -35,53 +35,29 @@ std::vector<bool> pattern(const std::string& bitsFirstOut)
 
 } // namespace
 
-TEST(ChainScanner, FindsTheDefaultChain)
+TEST(ChainScanner, FindsEveryDeviceWithItsIrLength)
 {
-    const auto r = scan(jexsim::SimOptions::defaultChain());
-    ASSERT_EQ(r.devices.size(), 3u);
-    EXPECT_EQ(r.devices[0].idcode, 0x4BA00477u);
-    EXPECT_EQ(r.devices[1].idcode, 0x0362D093u);
-    EXPECT_EQ(r.devices[2].idcode, 0x41111043u);
-    EXPECT_EQ(r.devices[0].irLength, 4u);
-    EXPECT_EQ(r.devices[1].irLength, 6u);
-    EXPECT_EQ(r.devices[2].irLength, 8u);
-    EXPECT_FALSE(r.ambiguous);
-    EXPECT_EQ(r.irCapture.size(), 18u);
-}
-
-TEST(ChainScanner, DeviceWithoutIdcodeIsCountedWithIdcodeZero)
-{
-    const auto r = scan({simtest::noIdcode(3), simtest::device(0x0362D093, 6), simtest::noIdcode(2),
-                         simtest::device(0x41111043, 8)});
-    ASSERT_EQ(r.devices.size(), 4u);
-    EXPECT_EQ(r.devices[0].idcode, 0u);
-    EXPECT_FALSE(r.hasIdcode[0]);
-    EXPECT_EQ(r.devices[1].idcode, 0x0362D093u);
-    EXPECT_TRUE(r.hasIdcode[1]);
-    EXPECT_EQ(r.devices[2].idcode, 0u);
-    EXPECT_EQ(r.devices[3].idcode, 0x41111043u);
-    EXPECT_EQ(r.devices[0].irLength, 3u);
-    EXPECT_EQ(r.devices[1].irLength, 6u);
-    EXPECT_EQ(r.devices[2].irLength, 2u);
-    EXPECT_EQ(r.devices[3].irLength, 8u);
-}
-
-TEST(ChainScanner, EmptyChainIsAWire)
-{
-    const auto r = scan({});
-    EXPECT_TRUE(r.devices.empty());
-    EXPECT_TRUE(r.irCapture.empty());
-}
-
-TEST(ChainScanner, LongChainAndLongRegisters)
-{
-    std::vector<DeviceSpec> specs;
-    for (uint32_t i = 0; i < 40; ++i) specs.push_back(simtest::device(0x00000001u | (i << 12), 2 + (i * 7) % 63));
-    const auto r = scan(specs);
-    ASSERT_EQ(r.devices.size(), 40u);
-    for (uint32_t i = 0; i < 40; ++i) {
-        EXPECT_EQ(r.devices[i].idcode, specs[i].idcode);
-        EXPECT_EQ(r.devices[i].irLength, specs[i].irLength);
+    std::vector<DeviceSpec> longChain;
+    for (uint32_t i = 0; i < 40; ++i) longChain.push_back(simtest::device(0x00000001u | (i << 12), 2 + (i * 7) % 63));
+    const std::vector<std::vector<DeviceSpec>> chains = {
+        jexsim::SimOptions::defaultChain(),
+        // Devices without IDCODE are counted with IDCODE 0.
+        {simtest::noIdcode(3), simtest::device(0x0362D093, 6), simtest::noIdcode(2), simtest::device(0x41111043, 8)},
+        {}, // a wire
+        longChain,
+    };
+    for (const auto& specs : chains) {
+        const auto r = scan(specs);
+        ASSERT_EQ(r.devices.size(), specs.size());
+        uint32_t irBits = 0;
+        for (std::size_t d = 0; d < specs.size(); ++d) {
+            EXPECT_EQ(r.devices[d].idcode, specs[d].hasIdcode ? specs[d].idcode : 0u) << d;
+            EXPECT_EQ(r.hasIdcode[d], specs[d].hasIdcode) << d;
+            EXPECT_EQ(r.devices[d].irLength, specs[d].irLength) << d;
+            irBits += specs[d].irLength;
+        }
+        EXPECT_FALSE(r.ambiguous);
+        EXPECT_EQ(r.irCapture.size(), irBits);
     }
 }
 
@@ -97,30 +73,28 @@ TEST(ChainScanner, StatusBitsThatLookLikeABoundaryAreJoinedBack)
 
 TEST(ChainScanner, SplitRule)
 {
-    std::vector<uint32_t> lengths;
-    bool ambiguous = false;
-    std::string error;
-    // Unique: every device captures ...01.
-    ASSERT_TRUE(ChainScanner::splitIr(pattern("1000" "100000" "10"), 3, lengths, ambiguous, error));
-    EXPECT_EQ(lengths, (std::vector<uint32_t>{4, 6, 2}));
-    EXPECT_FALSE(ambiguous);
-    // Upper bits of 1s that do not form 1,0 are no boundary.
-    ASSERT_TRUE(ChainScanner::splitIr(pattern("1011" "10"), 2, lengths, ambiguous, error));
-    EXPECT_EQ(lengths, (std::vector<uint32_t>{4, 2}));
-    EXPECT_FALSE(ambiguous);
-    // Pieces 2,4,4 for two devices: the shortest neighbouring pair is joined.
-    ASSERT_TRUE(ChainScanner::splitIr(pattern("10" "1000" "1000"), 2, lengths, ambiguous, error));
-    EXPECT_EQ(lengths, (std::vector<uint32_t>{6, 4}));
-    EXPECT_TRUE(ambiguous);
-    // Pieces 4,4,2: the pair at the TDI end is shorter.
-    ASSERT_TRUE(ChainScanner::splitIr(pattern("1000" "1000" "10"), 2, lengths, ambiguous, error));
-    EXPECT_EQ(lengths, (std::vector<uint32_t>{4, 6}));
-    // A tie goes to the pair nearest TDO.
-    ASSERT_TRUE(ChainScanner::splitIr(pattern("100" "100" "100"), 2, lengths, ambiguous, error));
-    EXPECT_EQ(lengths, (std::vector<uint32_t>{6, 3}));
-    // One device takes everything.
-    ASSERT_TRUE(ChainScanner::splitIr(pattern("10" "10" "10"), 1, lengths, ambiguous, error));
-    EXPECT_EQ(lengths, (std::vector<uint32_t>{6}));
+    struct Case {
+        const char* firstOut;
+        uint32_t devices;
+        std::vector<uint32_t> lengths;
+        bool ambiguous;
+    };
+    const Case cases[] = {
+        {"1000" "100000" "10", 3, {4, 6, 2}, false}, // every device captures ...01
+        {"1011" "10", 2, {4, 2}, false},              // upper 1s that do not form 1,0 are no boundary
+        {"10" "1000" "1000", 2, {6, 4}, true},        // the shortest neighbouring pair is joined
+        {"1000" "1000" "10", 2, {4, 6}, true},        // ... here the pair at the TDI end
+        {"100" "100" "100", 2, {6, 3}, true},         // a tie goes to the pair nearest TDO
+        {"10" "10" "10", 1, {6}, true},               // one device takes everything
+    };
+    for (const Case& c : cases) {
+        std::vector<uint32_t> lengths;
+        bool ambiguous = !c.ambiguous;
+        std::string error;
+        ASSERT_TRUE(ChainScanner::splitIr(pattern(c.firstOut), c.devices, lengths, ambiguous, error)) << c.firstOut;
+        EXPECT_EQ(lengths, c.lengths) << c.firstOut;
+        EXPECT_EQ(ambiguous, c.ambiguous) << c.firstOut;
+    }
 }
 
 TEST(ChainScanner, SplitRuleRefusesWhatIeeeForbids)

@@ -1,9 +1,6 @@
 // The cable instance linked directly: states and registers behind the ABI.
 #include <gtest/gtest.h>
 
-#include <fstream>
-#include <sstream>
-
 #include "SimCable.hpp"
 #include "SimTestSupport.hpp"
 #include "support/TestSupport.hpp"
@@ -11,7 +8,6 @@
 using jexsim::SimCable;
 using jexsim::SimDevice;
 using simtest::bits;
-using simtest::value;
 
 namespace {
 
@@ -30,6 +26,11 @@ protected:
         for (const auto& a : args) argv.push_back(a.c_str());
         cable.setSessionHandle(0x00010000);
         ASSERT_EQ(cable.openTarget(static_cast<uint32_t>(argv.size()), argv.data(), nullptr), JEX_SUCCESS);
+    }
+    uint32_t set(const std::string& keyValue)
+    {
+        return cable.sendCommand("set", reinterpret_cast<const uint8_t*>(keyValue.c_str()),
+                                 static_cast<uint32_t>(keyValue.size() + 1), nullptr, nullptr, nullptr);
     }
     JexJtagTapState state() const { return cable.engine()->state(); }
 
@@ -85,64 +86,22 @@ TEST_F(SimCableTest, DeviceShiftsPadWithTheHeldIrLengths)
     EXPECT_EQ(cable.chain()->device(2).selected(), SimDevice::DataRegister::Bypass);
 }
 
-TEST_F(SimCableTest, PinsFollowWhatTheCableDrove)
-{
-    open();
-    std::vector<uint8_t> out(1, 0);
-    ASSERT_EQ(cable.shiftChainIRRead(false, out.data(), nullptr, 3, JEXJTAG_SHIFT_IR, nullptr), JEX_SUCCESS);
-    uint32_t level = 9;
-    ASSERT_EQ(cable.getPin(JEXJTAG_TMS, &level), JEX_SUCCESS);
-    EXPECT_EQ(level, 0u);
-    ASSERT_EQ(cable.getPin(JEXJTAG_TDI, &level), JEX_SUCCESS);
-    EXPECT_EQ(level, 0u);
-    ASSERT_EQ(cable.getPin(JEXJTAG_TCK, &level), JEX_SUCCESS);
-    EXPECT_EQ(level, 1u);
-    // TCK is high: a pulse goes low and back, one rising edge.
-    const uint64_t before = cable.chain()->cycles();
-    ASSERT_EQ(cable.setPin(JEXJTAG_TMS, 1), JEX_SUCCESS);
-    ASSERT_EQ(cable.pulsePin(JEXJTAG_TCK, 2), JEX_SUCCESS);
-    EXPECT_EQ(cable.chain()->cycles() - before, 2u);
-    EXPECT_EQ(state(), JEXJTAG_UPDATE_IR);
-    EXPECT_EQ(cable.chain()->device(0).state(), JEXJTAG_UPDATE_IR);
-}
-
 TEST_F(SimCableTest, WaveformCanBeStartedAndStoppedByOption)
 {
     open();
     const std::string path = (dir.path() / "run.vcd").string();
-    const std::string setVcd = "vcd=" + path;
-    ASSERT_EQ(cable.sendCommand("set", reinterpret_cast<const uint8_t*>(setVcd.c_str()),
-                                static_cast<uint32_t>(setVcd.size() + 1), nullptr, nullptr, nullptr),
-              JEX_SUCCESS);
+    ASSERT_EQ(set("vcd=" + path), JEX_SUCCESS);
     ASSERT_EQ(cable.navigateTAP(JEXJTAG_SHIFT_DR, 0), JEX_SUCCESS);
-    const std::string chain = "chain=none:2";
-    EXPECT_EQ(cable.sendCommand("set", reinterpret_cast<const uint8_t*>(chain.c_str()),
-                                static_cast<uint32_t>(chain.size() + 1), nullptr, nullptr, nullptr),
-              JEX_FAILURE)
-        << "the chain cannot change under a recording";
+    EXPECT_EQ(set("chain=none:2"), JEX_FAILURE) << "the chain cannot change under a recording";
     EXPECT_TRUE(simtest::Messages::contains(JEX_MSG_ERROR, "waveform"));
-    const std::string stop = "vcd=";
-    ASSERT_EQ(cable.sendCommand("set", reinterpret_cast<const uint8_t*>(stop.c_str()),
-                                static_cast<uint32_t>(stop.size() + 1), nullptr, nullptr, nullptr),
-              JEX_SUCCESS);
+    ASSERT_EQ(set("vcd="), JEX_SUCCESS);
     ASSERT_EQ(cable.navigateTAP(JEXJTAG_RUN_TEST_IDLE, 0), JEX_SUCCESS);
 
-    std::ifstream in(path);
-    std::stringstream text;
-    text << in.rdbuf();
-    const std::string vcd = text.str();
+    const std::string vcd = testsupport::readFile(path);
     EXPECT_NE(vcd.find("$enddefinitions"), std::string::npos);
     EXPECT_NE(vcd.find("dev2_state"), std::string::npos);
     EXPECT_NE(vcd.find("b0100 "), std::string::npos) << "Shift-DR was recorded";
     EXPECT_EQ(vcd.find("b0101 "), std::string::npos) << "nothing after the recording stopped";
-}
-
-TEST_F(SimCableTest, AmbiguousIrLengthsAreGuessedWithAWarning)
-{
-    open({"chain=0x0362D093:6:capture=0x5,0x4BA00477:4"});
-    EXPECT_EQ(cable.getIRLength(0), 6);
-    EXPECT_EQ(cable.getIRLength(1), 4);
-    EXPECT_TRUE(simtest::Messages::contains(JEX_MSG_WARNING, "ambiguous"));
 }
 
 TEST_F(SimCableTest, CloseReleasesEverything)

@@ -60,26 +60,26 @@ struct CountingObserver : jexsim::ChainObserver {
 
 } // namespace
 
-TEST(SimModel, IdcodesLeaveDeviceZeroFirstAfterReset)
+TEST(SimModel, ResetSelectsIdcodeAndCaptureIrLoadsEachDevicesPattern)
 {
     Bench b(threeDevices());
-    const auto out = b.read(DR, 32 + 1 + 32 + 8);
-    EXPECT_EQ(value(out, 32, 0), 0x4BA00477u);
+    auto out = b.read(DR, 32 + 1 + 32 + 8);
+    EXPECT_EQ(value(out, 32, 0), 0x4BA00477u) << "device 0 leaves first";
     EXPECT_EQ(value(out, 1, 32), 0u) << "a device without IDCODE selects BYPASS, which captures 0";
     EXPECT_EQ(value(out, 32, 33), 0x0362D093u);
     EXPECT_EQ(value(out, 8, 65), 0xFFu) << "then the TDI level comes through";
-}
 
-TEST(SimModel, CaptureIrLoadsEachDevicesPattern)
-{
-    Bench b(threeDevices());
-    const auto out = b.read(IR, 15);
+    out = b.read(IR, 15);
     EXPECT_EQ(value(out, 4, 0), 0x1u);
     EXPECT_EQ(value(out, 5, 4), 0x5u);
     EXPECT_EQ(value(out, 6, 9), 0x11u);
-    // After the scan every IR holds ones: BYPASS everywhere.
+    // After the scan every IR holds ones: BYPASS everywhere, until a reset.
     for (std::size_t d = 0; d < b.chain.size(); ++d)
         EXPECT_EQ(b.chain.device(d).selected(), SimDevice::DataRegister::Bypass);
+    b.engine.resetTap();
+    EXPECT_EQ(b.chain.device(0).selected(), SimDevice::DataRegister::Idcode);
+    EXPECT_EQ(b.chain.device(1).selected(), SimDevice::DataRegister::Bypass);
+    EXPECT_EQ(b.chain.device(2).selected(), SimDevice::DataRegister::Idcode);
 }
 
 TEST(SimModel, EveryUnassignedOpcodeActsAsBypass)
@@ -99,17 +99,6 @@ TEST(SimModel, EveryUnassignedOpcodeActsAsBypass)
             EXPECT_EQ(value(out, 39, 1), (uint64_t{1} << 39) - 1) << "opcode " << opcode << ": one-bit register";
         }
     }
-}
-
-TEST(SimModel, ResetSelectsIdcodeAgain)
-{
-    Bench b(threeDevices());
-    b.write(IR, bits(0x7FFF, 15), 15);
-    EXPECT_EQ(b.chain.device(0).selected(), SimDevice::DataRegister::Bypass);
-    b.engine.resetTap();
-    EXPECT_EQ(b.chain.device(0).selected(), SimDevice::DataRegister::Idcode);
-    EXPECT_EQ(b.chain.device(1).selected(), SimDevice::DataRegister::Bypass);
-    EXPECT_EQ(b.chain.device(2).selected(), SimDevice::DataRegister::Idcode);
 }
 
 TEST(SimModel, UserRegisterKeepsWhatIsWritten)
@@ -166,21 +155,6 @@ TEST(SimModel, ExitStatesAreReachedAndShiftsContinue)
     EXPECT_EQ(b.chain.device(0).state(), JEXJTAG_PAUSE_DR);
     b.engine.moveTo(JEXJTAG_UPDATE_DR);
     EXPECT_EQ(b.chain.device(0).userRegister(), 0x1234BEEFu);
-}
-
-TEST(SimModel, PinLevelClocksWalkTheTap)
-{
-    Bench b(threeDevices());
-    // TLR -0-> RTI -1-> Select-DR -1-> Select-IR -0-> Capture-IR -0-> Shift-IR
-    for (bool tms : {false, true, true, false, false}) b.engine.clock(tms, true);
-    for (std::size_t d = 0; d < b.chain.size(); ++d) EXPECT_EQ(b.chain.device(d).state(), JEXJTAG_SHIFT_IR);
-    EXPECT_EQ(b.engine.state(), JEXJTAG_SHIFT_IR);
-    // TDO now shows device 0's captured IR bit by bit.
-    std::vector<bool> out;
-    for (int i = 0; i < 4; ++i) out.push_back(b.engine.clock(false, true));
-    EXPECT_EQ(out, (std::vector<bool>{true, false, false, false}));
-    for (int i = 0; i < 5; ++i) b.engine.clock(true, true);
-    EXPECT_EQ(b.chain.device(2).state(), JEXJTAG_TEST_LOGIC_RESET);
 }
 
 TEST(SimModel, TdoIsReleasedOutsideShiftStatesAndAWireChainPassesTdi)

@@ -71,15 +71,6 @@ TEST(TapController, EveryStateFollowsTheIeeeDiagram)
     }
 }
 
-TEST(TapController, FiveTmsHighClocksResetFromAnyState)
-{
-    for (int s = 0; s < 16; ++s) {
-        TapController tap(S(s));
-        for (int i = 0; i < 5; ++i) tap.clock(true);
-        EXPECT_EQ(tap.state(), JEXJTAG_TEST_LOGIC_RESET) << TapController::name(s);
-    }
-}
-
 TEST(TapController, PathsAreShortestAndArrive)
 {
     const auto dist = distances();

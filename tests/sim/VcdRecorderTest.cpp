@@ -1,82 +1,18 @@
 // The waveform file: a well-formed VCD that follows what was driven.
 #include <gtest/gtest.h>
 
-#include <fstream>
 #include <map>
-#include <sstream>
 
 #include "JtagEngine.hpp"
 #include "SimChain.hpp"
 #include "SimTestSupport.hpp"
+#include "VcdFile.hpp"
 #include "VcdRecorder.hpp"
 #include "support/TestSupport.hpp"
 
 using jexcable::JtagEngine;
 using jexsim::SimChain;
 using jexsim::VcdRecorder;
-
-namespace {
-
-struct Vcd {
-    std::map<std::string, std::string> names;   // identifier -> signal name
-    std::map<std::string, int> widths;          // identifier -> width
-    std::vector<uint64_t> times;
-    // signal name -> (time, value) changes after #0
-    std::map<std::string, std::vector<std::pair<uint64_t, std::string>>> changes;
-    std::map<std::string, std::string> initial; // from $dumpvars
-    std::string timescale;
-    bool definitionsEnded = false;
-};
-
-Vcd parse(const std::string& path)
-{
-    Vcd vcd;
-    std::ifstream in(path);
-    std::string token;
-    uint64_t now = 0;
-    bool inDumpvars = false;
-    while (in >> token) {
-        if (token == "$var") {
-            std::string type, width, id, name, end;
-            in >> type >> width >> id >> name >> end;
-            EXPECT_EQ(end, "$end");
-            vcd.names[id] = name;
-            vcd.widths[id] = std::stoi(width);
-        } else if (token == "$timescale") {
-            in >> vcd.timescale;
-        } else if (token == "$enddefinitions") {
-            vcd.definitionsEnded = true;
-        } else if (token == "$dumpvars") {
-            inDumpvars = true;
-        } else if (token == "$end") {
-            inDumpvars = false;
-        } else if (token[0] == '#') {
-            now = std::stoull(token.substr(1));
-            vcd.times.push_back(now);
-        } else if (vcd.definitionsEnded && (token[0] == '0' || token[0] == '1')) {
-            const std::string id = token.substr(1);
-            EXPECT_TRUE(vcd.names.count(id)) << token;
-            if (inDumpvars) vcd.initial[vcd.names[id]] = token.substr(0, 1);
-            else vcd.changes[vcd.names[id]].emplace_back(now, token.substr(0, 1));
-        } else if (vcd.definitionsEnded && token[0] == 's') {
-            std::string id;
-            in >> id;
-            EXPECT_TRUE(vcd.names.count(id)) << id;
-            if (inDumpvars) vcd.initial[vcd.names[id]] = token.substr(1);
-            else vcd.changes[vcd.names[id]].emplace_back(now, token.substr(1));
-        } else if (vcd.definitionsEnded && token[0] == 'b') {
-            std::string id;
-            in >> id;
-            EXPECT_TRUE(vcd.names.count(id)) << id;
-            EXPECT_EQ(static_cast<int>(token.size()) - 1, vcd.widths[id]);
-            if (inDumpvars) vcd.initial[vcd.names[id]] = token.substr(1);
-            else vcd.changes[vcd.names[id]].emplace_back(now, token.substr(1));
-        }
-    }
-    return vcd;
-}
-
-} // namespace
 
 TEST(VcdRecorder, RecordsPinsAndEveryTapState)
 {
@@ -93,7 +29,10 @@ TEST(VcdRecorder, RecordsPinsAndEveryTapState)
         engine.moveTo(JEXJTAG_RUN_TEST_IDLE); // 3 cycles
         recorder.flush();
     }
-    const Vcd vcd = parse(path);
+    const std::string text = testsupport::readFile(path);
+    EXPECT_EQ(text.rfind("$date ", 0), 0u);
+    EXPECT_NE(text.find("$enddefinitions $end\n#0\n$dumpvars\n"), std::string::npos);
+    const vcdtest::Vcd vcd = vcdtest::parse(path);
     ASSERT_TRUE(vcd.definitionsEnded);
     EXPECT_EQ(vcd.timescale, "1ps");
     std::map<std::string, int> byName;
