@@ -23,33 +23,28 @@ namespace {
 const std::string kDevA = "0000_1010_0000_0000_0001_0000_1001_0011"; // 0x0A001093
 const std::string P = "00001010000000000001000010010011";           // the same without '_'
 
-void read(Jex_DeviceData& table, const std::string& text, bool user = false, const char* name = "test.lst")
+void read(Jex_DeviceData& table, const std::string& text, bool user = false)
 {
     std::istringstream in(text);
-    table.addEntriesFromFile(name, in, user);
+    table.addEntriesFromFile("test.lst", in, user);
 }
 
-// The message of the error that reading text throws, or "" when it reads.
-std::string errorOf(const std::string& text, Jex_DeviceData* into = nullptr)
+// The message of the error that f throws, or "" when it throws none.
+template <class F>
+std::string thrown(F&& f)
 {
-    Jex_DeviceData local;
     try {
-        read(into ? *into : local, text);
+        f();
     } catch (const std::logic_error& e) {
         return e.what();
     }
     return "";
 }
 
-// The message of the error that reading the named file throws, or "".
-std::string fileErrorOf(Jex_DeviceData& table, const std::string& path)
+std::string errorOf(const std::string& text)
 {
-    try {
-        table.addEntriesFromFile(path.c_str(), false);
-    } catch (const std::logic_error& e) {
-        return e.what();
-    }
-    return "";
+    Jex_DeviceData table;
+    return thrown([&] { read(table, text); });
 }
 
 std::string lineError(int line, const std::string& reason)
@@ -205,7 +200,7 @@ TEST(DeviceDataErrors, EntriesBeforeABadLineStayAndNothingOlderIsLost)
     Jex_DeviceData table;
     read(table, "1" + P.substr(1) + " 6 0 0 OLD\n");
     const std::string text = "1111" + P.substr(4) + " 4 0 0 NEWB\n" + P + " 6 0 0 NEWA\n" + P + " 6 1 2 X\n";
-    EXPECT_EQ(lineError(2, "bad data."), errorOf(text, &table));
+    EXPECT_EQ(lineError(2, "bad data."), thrown([&] { read(table, text); }));
     ASSERT_EQ(3u, table.getEntryCount());
     // Appended behind the older entries, in reading order (not sorted yet).
     EXPECT_EQ("OLD", table.getEntry(0).getName());
@@ -261,20 +256,24 @@ TEST(DeviceDataFiles, ErrorsNameTheFileTheyCameFrom)
 {
     TempDir dir;
     Jex_DeviceData table;
+    const auto errorReading = [](Jex_DeviceData& t, const std::string& path) {
+        return thrown([&] { t.addEntriesFromFile(path.c_str(), false); });
+    };
     const std::string missing = (dir / "none.lst").string();
-    EXPECT_EQ("Error: Unable to open " + missing, fileErrorOf(table, missing));
-    EXPECT_NE("", fileErrorOf(table, dir.str())); // a directory
+    EXPECT_EQ("Error: Unable to open " + missing, errorReading(table, missing));
+    EXPECT_NE("", errorReading(table, dir.str())); // a directory
 
     const std::string list = (dir / "chips.lst").string();
     writeFile(list, P + " 6 1 2 FROMLIST\n");
     writeFile(dir / "chips.acd", "IDCODELIST=" + P + " 6 1 2 OK:" + P + " 6 1 2 X\n");
-    EXPECT_EQ("Input error in file: " + (dir / "chips.acd").string() + " line:1 - bad data.", fileErrorOf(table, list));
+    EXPECT_EQ("Input error in file: " + (dir / "chips.acd").string() + " line:1 - bad data.",
+              errorReading(table, list));
     EXPECT_EQ(2u, table.getEntryCount()); // FROMLIST and OK stay
 
     // A bad line in the list itself: the data file is not read.
     Jex_DeviceData other;
     writeFile(list, P + " 6 1 2 FIRST\nbad\n");
-    EXPECT_NE("", fileErrorOf(other, list));
+    EXPECT_NE("", errorReading(other, list));
     EXPECT_EQ(1u, other.getEntryCount());
 }
 

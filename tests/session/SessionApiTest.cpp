@@ -4,6 +4,7 @@
 
 #include <cstring>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include "jexjtag/jexjtag.h"
@@ -38,6 +39,16 @@ protected:
 
 TEST_F(SessionApiTest, HandlesAreHandedOutInOrderAndMaskedOnLookup)
 {
+    // Bad arguments fail cleanly and do not advance the id counter.
+    EXPECT_EQ(JEX_FAILURE, JexJtag_session_create(nullptr, 0, nullptr, nullptr));
+    unsigned handle = 7;
+    EXPECT_EQ(JEX_FAILURE, JexJtag_session_create(nullptr, 2, nullptr, &handle));
+    EXPECT_EQ(0u, handle);
+    const char* withNull[] = {"a=b", nullptr};
+    handle = 7;
+    EXPECT_EQ(JEX_FAILURE, JexJtag_session_create(nullptr, 2, withNull, &handle));
+    EXPECT_EQ(0u, handle);
+
     const unsigned first = create(recordMessage);
     const unsigned second = create(recordMessage);
     EXPECT_EQ(0x00010000u, first);
@@ -85,19 +96,6 @@ TEST_F(SessionApiTest, CreationFailsOnlyWhenAllIdsAreLive)
     EXPECT_EQ(0u, handle);
     EXPECT_EQ(JEX_SUCCESS, JexJtag_session_destroy(handles[7]));
     EXPECT_EQ(handles[7], create());
-}
-
-TEST_F(SessionApiTest, BadCreationArgumentsFailCleanly)
-{
-    EXPECT_EQ(JEX_FAILURE, JexJtag_session_create(nullptr, 0, nullptr, nullptr));
-    unsigned handle = 7;
-    EXPECT_EQ(JEX_FAILURE, JexJtag_session_create(nullptr, 2, nullptr, &handle));
-    EXPECT_EQ(0u, handle);
-    const char* withNull[] = {"a=b", nullptr};
-    EXPECT_EQ(JEX_FAILURE, JexJtag_session_create(nullptr, 2, withNull, &handle));
-    EXPECT_EQ(0u, handle);
-    // Failed creations do not advance the id counter.
-    EXPECT_EQ(0x00010000u, create());
 }
 
 TEST_F(SessionApiTest, ApiVersionRules)
@@ -151,13 +149,10 @@ TEST_F(SessionApiTest, MessagesWithoutCallbackArePrintedWithTheirPrefix)
 {
     const unsigned h = create();
     ::testing::internal::CaptureStdout();
-    JexJtag_session_sendMessage(h, JEX_MSG_ERROR, "bad cable\n");
-    JexJtag_session_sendMessage(h, JEX_MSG_WARNING, "w");
-    JexJtag_session_sendMessage(h, JEX_MSG_STATUS, "s");
-    JexJtag_session_sendMessage(h, JEX_MSG_INFO, "i");
-    JexJtag_session_sendMessage(h, JEX_MSG_NOISE, "n");
-    JexJtag_session_sendMessage(h, 7, "d");
-    JexJtag_session_sendMessage(h, JEX_MSG_SILENT, "never shown");
+    for (const auto& [type, text] : {std::pair<unsigned, const char*> {JEX_MSG_ERROR, "bad cable\n"},
+                                     {JEX_MSG_WARNING, "w"}, {JEX_MSG_STATUS, "s"}, {JEX_MSG_INFO, "i"},
+                                     {JEX_MSG_NOISE, "n"}, {7u, "d"}, {JEX_MSG_SILENT, "never shown"}})
+        JexJtag_session_sendMessage(h, type, text);
     EXPECT_EQ("Error:bad cable\nWarning:wStatus:sInfo:ind", ::testing::internal::GetCapturedStdout());
 }
 

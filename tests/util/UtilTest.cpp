@@ -1,5 +1,5 @@
-// The utility layer: argument lookup, texts, data directory, private
-// temporary files and the logger's sink.
+// The utility layer: argument lookup, texts, private temporary files and the
+// logger's sink.
 
 #include <gtest/gtest.h>
 
@@ -44,17 +44,6 @@ TEST(JexUtil, TextHelpers)
     EXPECT_STREQ("JEX_FAILURE", statusText(0x80000005u));
     EXPECT_STREQ("NULL", PointerText(nullptr).c_str());
     EXPECT_STREQ("0x00001000", PointerText(reinterpret_cast<void*>(0x1000)).c_str());
-}
-
-TEST(JexUtil, DataDirectoryAlwaysEndsInASeparator)
-{
-    Jex_Util::setUserDataDirPath("/opt/x");
-    EXPECT_EQ("/opt/x/", Jex_Util::getDataDirPath());
-    Jex_Util::setUserDataDirPath("/opt/x/");
-    EXPECT_EQ("/opt/x/", Jex_Util::getDataDirPath());
-    Jex_Util::setUserDataDirPath("");
-    ScopedEnv env("JEXJTAG_DATA_DIR", "/srv/data");
-    EXPECT_EQ("/srv/data/", Jex_Util::getDataDirPath());
 }
 
 TEST(JexUtil, TemporaryFilesArePrivateUniqueAndStayInLumenfold)
