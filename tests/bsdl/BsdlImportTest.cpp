@@ -6,11 +6,10 @@
 
 #include <cstring>
 #include <filesystem>
-#include <fstream>
-#include <sstream>
 #include <string>
 #include <vector>
 
+#include "BsdlTestData.hpp"
 #include "jexjtag/jexjtag.h"
 #include "support/TestSupport.hpp"
 
@@ -21,8 +20,6 @@ namespace fs = std::filesystem;
 
 namespace {
 
-const std::string kData = BSDL_TEST_DATA_DIR;
-
 struct Received {
     unsigned type;
     std::string text;
@@ -32,13 +29,19 @@ std::vector<Received> g_received;
 void record(unsigned, unsigned type, const char* text) { g_received.push_back({type, text}); }
 
 struct Outputs {
-    Outputs() { fill('Z'); }
-    void fill(char c)
+    Outputs()
     {
-        std::memset(name, c, sizeof name);
-        std::memset(idcode, c, sizeof idcode);
-        std::memset(bypass, c, sizeof bypass);
+        std::memset(name, 'Z', sizeof name);
+        std::memset(idcode, 'Z', sizeof idcode);
+        std::memset(bypass, 'Z', sizeof bypass);
         irlength = 0xABCD;
+    }
+    // Every text buffer holds only c.
+    bool all(char c) const
+    {
+        return std::string(name, sizeof name) == std::string(sizeof name, c) &&
+               std::string(idcode, sizeof idcode) == std::string(sizeof idcode, c) &&
+               std::string(bypass, sizeof bypass) == std::string(sizeof bypass, c);
     }
     char name[64];
     unsigned irlength;
@@ -56,20 +59,6 @@ uint32_t parseText(unsigned handle, const std::string& filename, const std::stri
 {
     return JexJtag_db_parseBSDL(handle, filename.c_str(), text.data(), static_cast<unsigned>(text.size()), o.name,
                                 sizeof o.name, &o.irlength, o.idcode, sizeof o.idcode, o.bypass, sizeof o.bypass);
-}
-
-bool allZero(const char* buf, size_t n)
-{
-    for (size_t i = 0; i < n; ++i)
-        if (buf[i] != '\0') return false;
-    return true;
-}
-
-bool allOf(const char* buf, size_t n, char c)
-{
-    for (size_t i = 0; i < n; ++i)
-        if (buf[i] != c) return false;
-    return true;
 }
 
 class BsdlImportTest : public ::testing::Test {
@@ -104,32 +93,13 @@ protected:
     unsigned handle = 0;
 };
 
-struct ManifestRow {
-    std::string file, entity, irLength, idcode, bypass;
-};
-
-std::vector<ManifestRow> readManifest()
-{
-    std::ifstream in(kData + "/MANIFEST.tsv");
-    std::vector<ManifestRow> rows;
-    std::string line;
-    std::getline(in, line);
-    while (std::getline(in, line)) {
-        std::vector<std::string> f;
-        std::stringstream s(line);
-        std::string field;
-        while (std::getline(s, field, '\t')) f.push_back(field);
-        if (f.size() >= 5) rows.push_back({f[0], f[1], f[2], f[3], f[4]});
-    }
-    return rows;
-}
-
 } // namespace
 
 TEST_F(BsdlImportTest, EveryVendorFileFromFileAndFromMemory)
 {
     const std::vector<ManifestRow> rows = readManifest();
     ASSERT_GE(rows.size(), 30u);
+    ASSERT_EQ(vendorFileCount(), rows.size());
     for (const ManifestRow& row : rows) {
         SCOPED_TRACE(row.file);
         const std::string path = kData + "/" + row.file;
@@ -166,9 +136,7 @@ TEST_F(BsdlImportTest, MalformedFileFailsWithTheProblemAndLeavesNoCopy)
     const std::string copy = (env.home() / ".lumenfold" / "wrong-unterminated-string.bsd").string();
     EXPECT_EQ(0u, errors[0].find("BSDL file '" + copy)) << errors[0];
     EXPECT_NE(std::string::npos, errors[0].find("', line 32: string literal is not closed")) << errors[0];
-    EXPECT_TRUE(allZero(o.name, sizeof o.name));
-    EXPECT_TRUE(allZero(o.idcode, sizeof o.idcode));
-    EXPECT_TRUE(allZero(o.bypass, sizeof o.bypass));
+    EXPECT_TRUE(o.all('\0'));
     EXPECT_EQ(0u, o.irlength);
     expectNoTemporaryFiles();
 
@@ -198,7 +166,7 @@ TEST_F(BsdlImportTest, BufferRules)
     Outputs o;
     ASSERT_EQ(JEX_SUCCESS, parseFile(handle, "  " + good + " \t", o));
     EXPECT_STREQ("FIXTURE_DEV", o.name);
-    EXPECT_TRUE(allZero(o.name + 11, sizeof o.name - 11)); // padded with NULs
+    EXPECT_EQ(std::string(sizeof o.name - 11, '\0'), std::string(o.name + 11, sizeof o.name - 11)); // NUL-padded
 
     // Texts longer than their buffers are cut to size - 1 and terminated.
     char name[5], idcode[9], bypass[3];
@@ -219,8 +187,7 @@ TEST_F(BsdlImportTest, BufferRules)
     // A file that cannot be opened leaves every output as it was.
     Outputs untouched;
     EXPECT_EQ(JEX_FAILURE, parseFile(handle, kData + "/no-such-file.bsd", untouched));
-    EXPECT_TRUE(allOf(untouched.name, sizeof untouched.name, 'Z'));
-    EXPECT_TRUE(allOf(untouched.idcode, sizeof untouched.idcode, 'Z'));
+    EXPECT_TRUE(untouched.all('Z'));
     EXPECT_EQ(0xABCDu, untouched.irlength);
     EXPECT_EQ(JEX_FAILURE, JexJtag_db_parseBSDLFile(handle, nullptr, nullptr, 0, &irlength, nullptr, 0, nullptr, 0));
     EXPECT_EQ(JEX_FAILURE, parseFile(handle, kData, untouched)); // a directory
@@ -229,9 +196,7 @@ TEST_F(BsdlImportTest, BufferRules)
     // An unknown handle clears the outputs and fails without reading anything.
     Outputs cleared;
     EXPECT_EQ(JEX_FAILURE, parseFile(0x00770000, good, cleared));
-    EXPECT_TRUE(allZero(cleared.name, sizeof cleared.name));
-    EXPECT_TRUE(allZero(cleared.idcode, sizeof cleared.idcode));
-    EXPECT_TRUE(allZero(cleared.bypass, sizeof cleared.bypass));
+    EXPECT_TRUE(cleared.all('\0'));
     EXPECT_EQ(0u, cleared.irlength);
     EXPECT_TRUE(g_received.empty());
 
@@ -270,7 +235,7 @@ TEST_F(BsdlImportTest, TemporaryCopyIsNamedAfterTheBaseNameAndAlwaysRemoved)
     EXPECT_EQ(JEX_FAILURE, parseText(handle, "dev.bsd", testsupport::readFile(kData + "/st_CortexMx.bsd"), o));
     ASSERT_EQ(1u, messagesOf(JEX_MSG_ERROR).size());
     EXPECT_NE(std::string::npos, messagesOf(JEX_MSG_ERROR)[0].find(dir)) << messagesOf(JEX_MSG_ERROR)[0];
-    EXPECT_TRUE(allZero(o.name, sizeof o.name));
+    EXPECT_EQ(std::string(sizeof o.name, '\0'), std::string(o.name, sizeof o.name));
     EXPECT_EQ("in the way", testsupport::readFile(dir));
 }
 

@@ -9,6 +9,7 @@
 #include <string>
 #include <vector>
 
+#include "BsdlTestData.hpp"
 #include "MessageRecorder.hpp"
 #include "bsdl/BsdlDiagnostics.hpp"
 #include "bsdl/BsdlParser.hpp"
@@ -16,8 +17,6 @@
 #include "hostlayer/PortException.hpp"
 
 namespace {
-
-const std::string kData = BSDL_TEST_DATA_DIR;
 
 struct Release {
     void operator()(BsdlReader* r) const { r->removeReader(); }
@@ -52,34 +51,13 @@ std::wstring errorOf(const std::string& text, const char* name = "text.bsd")
     }
 }
 
-struct ManifestRow {
-    std::string file, entity, irLength, idcode, bypass, allBypass, notes;
-};
-
-std::vector<ManifestRow> readManifest()
-{
-    std::ifstream in(kData + "/MANIFEST.tsv");
-    std::vector<ManifestRow> rows;
-    std::string line;
-    std::getline(in, line); // column names
-    while (std::getline(in, line)) {
-        if (line.empty()) continue;
-        std::vector<std::string> f;
-        std::stringstream s(line);
-        std::string field;
-        while (std::getline(s, field, '\t')) f.push_back(field);
-        f.resize(9);
-        rows.push_back({f[0], f[1], f[2], f[3], f[4], f[5], f[8]});
-    }
-    return rows;
-}
-
 } // namespace
 
 TEST(BsdlReaderManifest, EveryVendorFileYieldsTheManifestValues)
 {
     const std::vector<ManifestRow> rows = readManifest();
     ASSERT_GE(rows.size(), 30u);
+    ASSERT_EQ(vendorFileCount(), rows.size());
     for (const ManifestRow& row : rows) {
         SCOPED_TRACE(row.file);
         MessageRecorder recorder;
@@ -103,11 +81,11 @@ TEST(BsdlReaderManifest, EveryVendorFileYieldsTheManifestValues)
         // Files written by board-test programs start with a line that is not
         // BSDL: it is skipped with a warning naming line 1; no other file
         // gets that warning.
-        const bool ictHeader = readAll(path).rfind("!!!!", 0) == 0;
-        EXPECT_EQ(ictHeader, recorder.has(Port_MsgMan::MSG_WARNING, L"line 1: text before the entity declaration"));
+        const std::string text = readAll(path);
+        EXPECT_EQ(text.rfind("!!!!", 0) == 0,
+                  recorder.has(Port_MsgMan::MSG_WARNING, L"line 1: text before the entity declaration"));
 
         // Every BYPASS opcode, in declaration order.
-        const std::string text = readAll(path);
         jexbsdl::BsdlDiagnostics diagnostics(path);
         jexbsdl::BsdlEntity entity;
         ASSERT_TRUE(jexbsdl::BsdlParser(text.data(), text.size(), diagnostics).parse(entity));

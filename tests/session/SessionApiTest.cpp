@@ -4,6 +4,7 @@
 
 #include <cstring>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include "jexjtag/jexjtag.h"
@@ -38,6 +39,16 @@ protected:
 
 TEST_F(SessionApiTest, HandlesAreHandedOutInOrderAndMaskedOnLookup)
 {
+    // Bad arguments fail cleanly and do not advance the id counter.
+    EXPECT_EQ(JEX_FAILURE, JexJtag_session_create(nullptr, 0, nullptr, nullptr));
+    unsigned handle = 7;
+    EXPECT_EQ(JEX_FAILURE, JexJtag_session_create(nullptr, 2, nullptr, &handle));
+    EXPECT_EQ(0u, handle);
+    const char* withNull[] = {"a=b", nullptr};
+    handle = 7;
+    EXPECT_EQ(JEX_FAILURE, JexJtag_session_create(nullptr, 2, withNull, &handle));
+    EXPECT_EQ(0u, handle);
+
     const unsigned first = create(recordMessage);
     const unsigned second = create(recordMessage);
     EXPECT_EQ(0x00010000u, first);
@@ -87,25 +98,14 @@ TEST_F(SessionApiTest, CreationFailsOnlyWhenAllIdsAreLive)
     EXPECT_EQ(handles[7], create());
 }
 
-TEST_F(SessionApiTest, BadCreationArgumentsFailCleanly)
-{
-    EXPECT_EQ(JEX_FAILURE, JexJtag_session_create(nullptr, 0, nullptr, nullptr));
-    unsigned handle = 7;
-    EXPECT_EQ(JEX_FAILURE, JexJtag_session_create(nullptr, 2, nullptr, &handle));
-    EXPECT_EQ(0u, handle);
-    const char* withNull[] = {"a=b", nullptr};
-    EXPECT_EQ(JEX_FAILURE, JexJtag_session_create(nullptr, 2, withNull, &handle));
-    EXPECT_EQ(0u, handle);
-    // Failed creations do not advance the id counter.
-    EXPECT_EQ(0x00010000u, create());
-}
-
 TEST_F(SessionApiTest, ApiVersionRules)
 {
+    LogCapture log(1);
     unsigned version = 0;
     char text[200];
     std::memset(text, 'z', sizeof text);
     EXPECT_EQ(JEX_FAILURE, JexJtag_session_getAPIVersion(&version, text, 127));
+    EXPECT_TRUE(log.has("JexJtag_session_getAPIVersion() -  versionLen is too small\n"));
     EXPECT_NE(0u, version); // written before the length check
     EXPECT_EQ('z', text[0]);
     version = 0;
@@ -115,15 +115,6 @@ TEST_F(SessionApiTest, ApiVersionRules)
     EXPECT_EQ(0, std::strncmp(text, "Version ", 8));
     EXPECT_EQ('\0', text[127]);
     EXPECT_EQ('z', text[128]); // only 128 bytes are touched
-}
-
-TEST_F(SessionApiTest, TooShortVersionBufferIsLogged)
-{
-    LogCapture log(1);
-    unsigned version = 0;
-    char text[16];
-    EXPECT_EQ(JEX_FAILURE, JexJtag_session_getAPIVersion(&version, text, sizeof text));
-    EXPECT_TRUE(log.has("JexJtag_session_getAPIVersion() -  versionLen is too small\n"));
 }
 
 TEST_F(SessionApiTest, PluginSearchPathBufferRule)
@@ -142,18 +133,15 @@ TEST_F(SessionApiTest, PluginSearchPathBufferRule)
     EXPECT_EQ(JEX_FAILURE, JexJtag_session_setPluginSearchPath(0x00770000, "/x"));
 }
 
-TEST_F(SessionApiTest, EmptyTargetListAndNullOutputs)
+// An empty target list and refreshing it are covered by SessionTargetListTest.
+TEST_F(SessionApiTest, TargetListNullOutputsAndUnknownHandle)
 {
     const unsigned h = create();
-    unsigned count = 99;
-    EXPECT_EQ(JEX_SUCCESS, JexJtag_session_getTargetCount(h, &count));
-    EXPECT_EQ(0u, count);
     EXPECT_EQ(JEX_FAILURE, JexJtag_session_getTargetCount(h, nullptr));
     EXPECT_EQ(JEX_FAILURE, JexJtag_session_getTargetXMLSizeByIndex(h, 0, nullptr));
     char xml[16], name[16], plugin[16];
     EXPECT_EQ(JEX_FAILURE, JexJtag_session_getTargetByIndex(h, 0, xml, sizeof xml, name, sizeof name, plugin,
                                                             sizeof plugin));
-    EXPECT_EQ(JEX_SUCCESS, JexJtag_session_refreshTargetList(h));
     EXPECT_EQ(JEX_FAILURE, JexJtag_session_refreshTargetList(h + 0x00010000));
 }
 
@@ -161,13 +149,10 @@ TEST_F(SessionApiTest, MessagesWithoutCallbackArePrintedWithTheirPrefix)
 {
     const unsigned h = create();
     ::testing::internal::CaptureStdout();
-    JexJtag_session_sendMessage(h, JEX_MSG_ERROR, "bad cable\n");
-    JexJtag_session_sendMessage(h, JEX_MSG_WARNING, "w");
-    JexJtag_session_sendMessage(h, JEX_MSG_STATUS, "s");
-    JexJtag_session_sendMessage(h, JEX_MSG_INFO, "i");
-    JexJtag_session_sendMessage(h, JEX_MSG_NOISE, "n");
-    JexJtag_session_sendMessage(h, 7, "d");
-    JexJtag_session_sendMessage(h, JEX_MSG_SILENT, "never shown");
+    for (const auto& [type, text] : {std::pair<unsigned, const char*> {JEX_MSG_ERROR, "bad cable\n"},
+                                     {JEX_MSG_WARNING, "w"}, {JEX_MSG_STATUS, "s"}, {JEX_MSG_INFO, "i"},
+                                     {JEX_MSG_NOISE, "n"}, {7u, "d"}, {JEX_MSG_SILENT, "never shown"}})
+        JexJtag_session_sendMessage(h, type, text);
     EXPECT_EQ("Error:bad cable\nWarning:wStatus:sInfo:ind", ::testing::internal::GetCapturedStdout());
 }
 
@@ -189,24 +174,21 @@ TEST_F(SessionApiTest, TraceLines)
 {
     LogCapture log(3);
     const char* args[] = {"alpha=1", "beta=two"};
-    unsigned h = 0;
+    unsigned h = 0, count = 0;
     ASSERT_EQ(JEX_SUCCESS, JexJtag_session_create(nullptr, 2, args, &h));
-    EXPECT_TRUE(log.has("JexJtag_session_create() argc=2\n"));
-    EXPECT_TRUE(log.has("JexJtag_session_create() argv[0]:alpha=1\n"));
-    EXPECT_TRUE(log.has("JexJtag_session_create() argv[1]:beta=two\n"));
-    EXPECT_TRUE(log.has("JexJtag_session_create() returning handle=65536\n"));
-
     JexJtag_session_sendMessage(h, 7, "dbg");
-    EXPECT_TRUE(log.has("JexJtag_session_sendMessage() handle=65536, msgType=JEX_MSG_DEBUG(7): dbg\n"));
     JexJtag_session_sendMessage(0x00420000, JEX_MSG_ERROR, "lost");
-    EXPECT_TRUE(log.has("JexJtag_session_sendMessage() handle=4325376, msgType=JEX_MSG_ERROR: lost\n"));
-
-    unsigned count = 0;
     JexJtag_session_getTargetCount(h, &count);
-    EXPECT_TRUE(log.has("JexJtag_session_getTargetCount() handle=65536\n"));
-    EXPECT_TRUE(log.has("JexJtag_session_getTargetCount() returning count=0\n"));
     JexJtag_session_destroy(h);
-    EXPECT_TRUE(log.has("JexJtag_session_destroy() handle=65536\n"));
+    for (const char* line : {"JexJtag_session_create() argc=2\n", "JexJtag_session_create() argv[0]:alpha=1\n",
+                             "JexJtag_session_create() argv[1]:beta=two\n",
+                             "JexJtag_session_create() returning handle=65536\n",
+                             "JexJtag_session_sendMessage() handle=65536, msgType=JEX_MSG_DEBUG(7): dbg\n",
+                             "JexJtag_session_sendMessage() handle=4325376, msgType=JEX_MSG_ERROR: lost\n",
+                             "JexJtag_session_getTargetCount() handle=65536\n",
+                             "JexJtag_session_getTargetCount() returning count=0\n",
+                             "JexJtag_session_destroy() handle=65536\n"})
+        EXPECT_TRUE(log.has(line)) << line;
 }
 
 TEST_F(SessionApiTest, LoggingOffWritesNothing)

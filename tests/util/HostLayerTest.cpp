@@ -6,7 +6,6 @@
 #include <vector>
 
 #include "hostlayer/Port_MsgDispatcher.hpp"
-#include "hostlayer/PortException.hpp"
 
 namespace {
 
@@ -33,15 +32,6 @@ TEST(HostLayer, EveryManagerInTheSetReceivesEachMessage)
     EXPECT_EQ(1u, a.received.size());
     EXPECT_EQ(2u, b.received.size());
     Port_MsgDispatcher::removeMsgMan(&b);
-}
-
-TEST(HostLayer, ExceptionCarriesItsWideMessage)
-{
-    try {
-        throw Port::Exception(L"bad.bsd line 3: unterminated string");
-    } catch (const Port::Exception& e) {
-        EXPECT_EQ(L"bad.bsd line 3: unterminated string", e.getMessage());
-    }
 }
 
 } // namespace

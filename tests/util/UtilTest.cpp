@@ -1,5 +1,5 @@
-// The utility layer: argument lookup, texts, data directory, private
-// temporary files and the logger's sink.
+// The utility layer: argument lookup, texts, private temporary files and the
+// logger's sink.
 
 #include <gtest/gtest.h>
 
@@ -37,17 +37,13 @@ TEST(JexUtil, TextHelpers)
     EXPECT_EQ(0, Jex_Util::strnicmp("GETX", "getY", 3));
     EXPECT_EQ("a b", Jex_Util::trimWhitespace(" \t a b\r\n"));
     EXPECT_EQ("", Jex_Util::trimWhitespace("   "));
-}
-
-TEST(JexUtil, DataDirectoryAlwaysEndsInASeparator)
-{
-    Jex_Util::setUserDataDirPath("/opt/x");
-    EXPECT_EQ("/opt/x/", Jex_Util::getDataDirPath());
-    Jex_Util::setUserDataDirPath("/opt/x/");
-    EXPECT_EQ("/opt/x/", Jex_Util::getDataDirPath());
-    Jex_Util::setUserDataDirPath("");
-    ScopedEnv env("JEXJTAG_DATA_DIR", "/srv/data");
-    EXPECT_EQ("/srv/data/", Jex_Util::getDataDirPath());
+    EXPECT_EQ("plain text", getLocalizedPortMsg(L"plain text"));
+    EXPECT_EQ("", getLocalizedPortMsg(static_cast<const wchar_t*>(nullptr)));
+    EXPECT_STREQ("JEX_SUCCESS", statusText(0));
+    EXPECT_STREQ("JEX_FAILURE", statusText(0x80000000u));
+    EXPECT_STREQ("JEX_FAILURE", statusText(0x80000005u));
+    EXPECT_STREQ("NULL", PointerText(nullptr).c_str());
+    EXPECT_STREQ("0x00001000", PointerText(reinterpret_cast<void*>(0x1000)).c_str());
 }
 
 TEST(JexUtil, TemporaryFilesArePrivateUniqueAndStayInLumenfold)
@@ -73,20 +69,6 @@ TEST(JexUtil, TemporaryFilesArePrivateUniqueAndStayInLumenfold)
     EXPECT_FALSE(std::filesystem::exists(home.path() / "escape"));
 }
 
-TEST(JexUtil, TemporaryFileRefusesALumenfoldThatIsNotADirectory)
-{
-    TempDir home;
-    ScopedEnv env("HOME", home.str());
-    testsupport::writeFile(home.path() / ".lumenfold", "not a directory");
-    EXPECT_THROW(Jex_Util::createDotLumenfoldTempFile("x"), Jex_Exception);
-}
-
-TEST(JexUtil, LocalizedPortMessage)
-{
-    EXPECT_EQ("plain text", getLocalizedPortMsg(L"plain text"));
-    EXPECT_EQ("", getLocalizedPortMsg(static_cast<const wchar_t*>(nullptr)));
-}
-
 TEST(Logger, WritesOnlyEnabledLevelsWithItsPrefix)
 {
     TempDir dir;
@@ -103,15 +85,6 @@ TEST(Logger, WritesOnlyEnabledLevelsWithItsPrefix)
               "[jexjtag 2] TDI: (17 bits)\n"
               "[jexjtag 2]   00000000: 01 AB FF\n",
               testsupport::readFile(path));
-}
-
-TEST(TraceText, StatusAndPointer)
-{
-    EXPECT_STREQ("JEX_SUCCESS", statusText(0));
-    EXPECT_STREQ("JEX_FAILURE", statusText(0x80000000u));
-    EXPECT_STREQ("JEX_FAILURE", statusText(0x80000005u));
-    EXPECT_STREQ("NULL", PointerText(nullptr).c_str());
-    EXPECT_STREQ("0x00001000", PointerText(reinterpret_cast<void*>(0x1000)).c_str());
 }
 
 } // namespace
