@@ -8,6 +8,10 @@ packages=(
   libgtest-dev libgmock-dev googletest libbenchmark-dev
   libxerces-c-dev
   clang libclang-rt-dev
+  libftdi1-dev                         # the USB cable (FTDI MPSSE adapters)
+  openocd                              # peer: remote_bitbang client, SVF player
+  python3-pytest python3-setuptools    # the Python package and its tests
+  dpkg-dev file                        # Debian packages (dpkg-shlibdeps)
 )
 
 missing=()
