@@ -12,6 +12,7 @@
 #include "LookupCommand.hpp"
 #include "MessageSink.hpp"
 #include "ScanCommand.hpp"
+#include "ServeCommand.hpp"
 #include "ShiftCommand.hpp"
 #include "TargetsCommand.hpp"
 #include "UsageError.hpp"
@@ -63,6 +64,7 @@ void runCommand(const Options& options, MessageSink& sink, std::ostream& out)
     case Command::Bsdl: runBsdl(options, sink, out); break;
     case Command::Shift: runShift(options, sink, out); break;
     case Command::Info: runInfo(options, sink, out); break;
+    case Command::Serve: runServe(options, sink, out); break;
     case Command::None:
     case Command::Help: break;
     }

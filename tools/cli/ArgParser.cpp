@@ -29,7 +29,9 @@ enum class Id {
     Device,
     Bits,
     Exit,
-    Ir
+    Ir,
+    Listen,
+    Socket
 };
 
 // Which commands an option applies to; kAll for the global ones.
@@ -37,6 +39,7 @@ enum : unsigned {
     kTargets = 1u << 0,
     kScan = 1u << 1,
     kShift = 1u << 2,
+    kServe = 1u << 3,
     kAll = ~0u,
 };
 
@@ -67,6 +70,8 @@ const OptionSpec kOptions[] = {
     {Id::Bits, "bits", 'n', true, kShift},
     {Id::Exit, "exit", 0, true, kShift},
     {Id::Ir, "ir", 0, true, kShift},
+    {Id::Listen, "listen", 0, true, kServe},
+    {Id::Socket, "socket", 0, true, kServe},
 };
 
 unsigned commandBit(Command command)
@@ -75,6 +80,7 @@ unsigned commandBit(Command command)
     case Command::Targets: return kTargets;
     case Command::Scan: return kScan;
     case Command::Shift: return kShift;
+    case Command::Serve: return kServe;
     default: return 0;
     }
 }
@@ -147,6 +153,14 @@ void apply(Options& options, const OptionSpec& option, const std::string& value)
         if (value.empty()) throw UsageError("--ir needs the instruction to shift");
         options.irData = value;
         break;
+    case Id::Listen:
+        if (value.empty()) throw UsageError("--listen needs HOST:PORT");
+        options.serveListen = value;
+        break;
+    case Id::Socket:
+        if (value.empty()) throw UsageError("--socket needs the path of a Unix socket");
+        options.serveSocket = value;
+        break;
     }
 }
 
@@ -170,6 +184,11 @@ void checkOperands(Options& options)
     case Command::Scan:
     case Command::Info:
         expect(0, 0, "takes no operands");
+        break;
+    case Command::Serve:
+        expect(0, 0, "takes no operands");
+        if (!options.serveListen.empty() && !options.serveSocket.empty())
+            throw UsageError("'serve' takes --listen or --socket, not both");
         break;
     case Command::Lookup:
         expect(1, 1, "needs one IDCODE");

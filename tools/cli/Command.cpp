@@ -10,7 +10,7 @@ struct Entry {
 };
 const Entry kCommands[] = {{Command::Help, "help"},     {Command::Targets, "targets"}, {Command::Scan, "scan"},
                            {Command::Lookup, "lookup"}, {Command::Bsdl, "bsdl"},       {Command::Shift, "shift"},
-                           {Command::Info, "info"}};
+                           {Command::Info, "info"}, {Command::Serve, "serve"}};
 
 } // namespace
 

@@ -6,7 +6,7 @@
 
 namespace jexjtag::cli {
 
-enum class Command { None, Help, Targets, Scan, Lookup, Bsdl, Shift, Info };
+enum class Command { None, Help, Targets, Scan, Lookup, Bsdl, Shift, Info, Serve };
 
 // The command named by text ("scan"), or none.
 std::optional<Command> commandFromName(const std::string& text);

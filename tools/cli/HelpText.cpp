@@ -18,6 +18,7 @@ Commands:
   bsdl FILE          read a BSDL file: entity, IR length, IDCODE, BYPASS
   shift ir|dr DATA   shift an instruction or data register and print TDO
   info               print the target's information record and the API version
+  serve              serve the target to remote_bitbang clients (OpenOCD)
   help [COMMAND]     print this text, or the page of one command
 
 Options for every command:
@@ -183,6 +184,26 @@ Examples:
   jexjtag shift dr --bits 96 --json       the whole chain's data registers
 )HELP";
 
+const char* const kServe = R"HELP(Usage: jexjtag serve [--listen HOST:PORT | --socket PATH] [OPTIONS]
+
+Opens the target, takes the cable lock and serves the chain as a
+remote_bitbang server, so that OpenOCD and other remote_bitbang clients can
+use it.  Prints one line "listening on HOST:PORT" (or "listening on PATH")
+when ready.  One client at a time; others wait.  Ctrl-C or SIGTERM ends it
+and releases the cable.
+
+Options:
+      --listen HOST:PORT  TCP address (default 127.0.0.1:0, 0 = any free port)
+      --socket PATH       a Unix-domain socket instead of TCP
+  -t, --target TYPE, -a, --arg KEY=VALUE, --chain CHAIN, --lock-wait MS,
+  --no-lock, --datadir DIR, --log-level N, --log-file FILE, --verbose:
+                          see jexjtag --help
+
+OpenOCD as the client:
+  openocd -c "adapter driver remote_bitbang" -c "remote_bitbang host 127.0.0.1"
+          -c "remote_bitbang port PORT" -c "transport select jtag" ...
+)HELP";
+
 } // namespace
 
 std::string helpText(Command command)
@@ -195,6 +216,7 @@ std::string helpText(Command command)
     case Command::Lookup: return kLookup;
     case Command::Bsdl: return kBsdl;
     case Command::Info: return kInfo;
+    case Command::Serve: return kServe;
     case Command::Shift: return std::string(kShiftHead) + tapStateNameList() + kShiftTail;
     }
     return kOverview;

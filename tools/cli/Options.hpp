@@ -46,6 +46,10 @@ struct Options {
     std::optional<unsigned> bits;
     std::optional<std::string> irData; // --ir: instruction shifted before a dr shift
     unsigned exitState = JEXJTAG_RUN_TEST_IDLE;
+
+    // serve
+    std::string serveListen; // --listen HOST:PORT
+    std::string serveSocket; // --socket PATH
 };
 
 } // namespace jexjtag::cli
