@@ -60,24 +60,26 @@ void RbbTransport::attach(RbbSocket socket)
 
 void RbbTransport::detach()
 {
+    // Replies still owed have no place to go any more.
+    m_reads.clear();
+    m_readIndex = 0;
+    m_readDone = 0;
+    m_unanswered = 0;
     if (m_socket.isOpen()) {
         try {
-            m_out.push_back('Q');
-            m_socket.sendSome(m_out.data(), m_out.size());
+            m_out.push_back('Q'); // after whatever is still queued
+            pump(false);
         } catch (const std::exception&) {
             // the server has gone already
         }
     }
     m_socket.close();
     m_out.clear();
-    m_reads.clear();
-    m_readIndex = 0;
-    m_readDone = 0;
-    m_unanswered = 0;
 }
 
 void RbbTransport::broken(const std::string& text)
 {
+    m_socket.close(); // part of the queue may have gone out: no 'Q' after it
     detach();
     throw std::runtime_error(text);
 }

@@ -135,7 +135,7 @@ def parse_chain(text):
     return devices
 
 
-def serve_client(conn, chain, fault, after):
+def serve_client(conn, srv, chain, fault, after):
     answered = 0
     muted = False
     while True:
@@ -151,6 +151,7 @@ def serve_client(conn, chain, fault, after):
             if c == ord("R"):
                 if fault and answered >= after:
                     if fault == "die":
+                        srv.close()  # refuse new clients before this one sees the end
                         if replies:
                             conn.sendall(bytes(replies))
                         os._exit(3)
@@ -203,7 +204,7 @@ def main():
         if not args.socket:
             conn.setsockopt(socket.IPPROTO_TCP, socket.TCP_NODELAY, 1)
         try:
-            serve_client(conn, chain, args.fault, args.after)
+            serve_client(conn, srv, chain, args.fault, args.after)
         except OSError:
             pass
         conn.close()
