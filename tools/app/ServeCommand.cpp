@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: MIT
-#include "ServeCommand.hpp"
+// The "serve" command: the opened, locked target as a remote_bitbang server.
 
 #include <optional>
 #include <stdexcept>
@@ -7,16 +7,48 @@
 #include <vector>
 
 #include "CliError.hpp"
+#include "Command.hpp"
 #include "LibrarySession.hpp"
+#include "MessageSink.hpp"
+#include "Options.hpp"
 #include "ServeEngine.hpp"
 #include "ServeListener.hpp"
 #include "StopSignal.hpp"
 #include "TargetConnection.hpp"
+#include "UsageError.hpp"
 #include "jexjtag/jexjtag.h"
 
 namespace jexjtag::cli {
 
 namespace {
+
+const char* const kPage = R"HELP(Usage: jexjtag serve [--listen HOST:PORT | --socket PATH] [OPTIONS]
+
+Opens the target, takes the cable lock and serves the chain as a
+remote_bitbang server (OpenOCD's "remote_bitbang" adapter protocol), so
+that OpenOCD and other remote_bitbang clients can use any cable of the
+library.  When ready it prints one line, "listening on HOST:PORT" (or
+"listening on PATH"), on stdout.  One client at a time; the next one waits
+until it leaves.  Ctrl-C or SIGTERM ends it and releases the cable.
+
+The client's TCK/TMS/TDI levels are followed on a TAP state machine and
+handed to the cable as TAP moves and register shifts in batches.  TRST
+requests reset the TAPs with TMS; SRST requests are ignored.
+
+Options:
+      --listen HOST:PORT  TCP address to listen on (default 127.0.0.1:0;
+                          port 0 takes any free port).  Other addresses than
+                          loopback only when named here
+      --socket PATH       listen on a Unix-domain socket instead
+  -t, --target TYPE, -a, --arg KEY=VALUE, --chain CHAIN, --lock-wait MS,
+      --no-lock, --datadir DIR, --log-level N, -v: see jexjtag --help
+                          (-v also shows clients coming and going)
+
+Examples:
+  jexjtag serve --listen 127.0.0.1:3335
+  openocd -c "adapter driver remote_bitbang" -c "remote_bitbang host 127.0.0.1" \
+          -c "remote_bitbang port 3335" -c "transport select jtag" -c init -c scan_chain
+)HELP";
 
 constexpr const char* kDefaultListen = "127.0.0.1:0";
 constexpr std::size_t kReceiveSize = 1 << 16;
@@ -29,7 +61,7 @@ void say(MessageSink& sink, unsigned type, const std::string& text)
     sink.deliver(type, ("serve: " + text).c_str());
 }
 
-// Serves one connected client until it leaves; false when a stop came.
+// Serves one connected client until it leaves, quits or a stop comes.
 void serveClient(ServeListener& listener, ServeEngine& engine, MessageSink& sink, const serve::StopSignal& stop)
 {
     std::vector<char> buffer(kReceiveSize);
@@ -64,7 +96,11 @@ void serveClient(ServeListener& listener, ServeEngine& engine, MessageSink& sink
     if (!why.empty()) say(sink, JEX_MSG_NOISE, listener.peer() + ": " + why);
 }
 
-} // namespace
+void checkServe(const Options& options)
+{
+    if (options.value("listen") && options.value("socket"))
+        throw UsageError("'serve' takes --listen or --socket, not both");
+}
 
 void runServe(const Options& options, MessageSink& sink, std::ostream& out)
 {
@@ -75,10 +111,9 @@ void runServe(const Options& options, MessageSink& sink, std::ostream& out)
     serve::StopSignal stop;
     std::optional<ServeListener> listener;
     try {
-        listener.emplace(options.serveSocket.empty()
-                             ? ServeListener::tcp(options.serveListen.empty() ? kDefaultListen : options.serveListen,
-                                                  stop.fd())
-                             : ServeListener::unixSocket(options.serveSocket, stop.fd()));
+        const std::optional<std::string> path = options.value("socket");
+        listener.emplace(path ? ServeListener::unixSocket(*path, stop.fd())
+                              : ServeListener::tcp(options.value("listen").value_or(kDefaultListen), stop.fd()));
     } catch (const std::runtime_error& e) {
         throw CliError(e.what());
     }
@@ -98,5 +133,16 @@ void runServe(const Options& options, MessageSink& sink, std::ostream& out)
         listener->dropClient();
     }
 }
+
+} // namespace
+
+extern const Command serveCommand = {
+    "serve", "serve", "serve the target to remote_bitbang clients (OpenOCD)",
+    {{"listen", 0, true, checkNonEmptyValue}, {"socket", 0, true, checkNonEmptyValue}},
+    0, 0, nullptr,
+    checkServe,
+    [] { return std::string(kPage); },
+    runServe,
+};
 
 } // namespace jexjtag::cli
