@@ -98,6 +98,17 @@ static void serve(int fd, struct tap* t)
         if (n <= 0) return;
         size_t replies = 0;
         for (ssize_t i = 0; i < n; ++i) {
+            /* Fast path: read-write bits in a Shift state ("0R4" / "1R5"),
+             * exactly what the per-byte model below would do. */
+            if ((t->state == SHIFT_DR || t->state == SHIFT_IR) && t->tck) {
+                while (i + 2 < n && (in[i] == '0' || in[i] == '1') && in[i + 1] == 'R' && in[i + 2] == in[i] + 4) {
+                    t->tdo = (int)(t->reg & 1);
+                    out[replies++] = (char)('0' + t->tdo);
+                    t->reg = (t->reg >> 1) | ((uint64_t)(in[i] - '0') << (t->len - 1));
+                    i += 3;
+                }
+                if (i >= n) break;
+            }
             const char c = in[i];
             if (c >= '0' && c <= '7') {
                 tap_write(t, c - '0');

@@ -68,7 +68,7 @@ void RbbTransport::detach()
     if (m_socket.isOpen()) {
         try {
             m_out.push_back('Q'); // after whatever is still queued
-            pump(false);
+            pump(UINT64_MAX);
         } catch (const std::exception&) {
             // the server has gone already
         }
@@ -114,8 +114,9 @@ void RbbTransport::addReads(const ShiftSink& sink, uint64_t offset, uint64_t cou
 
 void RbbTransport::makeRoom()
 {
-    if (m_unanswered >= kMaxUnanswered) pump(true);
-    else if (m_out.size() >= kSendChunk) pump(false);
+    // Half the reads stay in flight, so the server never waits for us.
+    if (m_unanswered >= kMaxUnanswered) pump(kMaxUnanswered / 2);
+    else if (m_out.size() >= kSendChunk) pump(m_unanswered);
 }
 
 void RbbTransport::moveTms(const uint8_t* tms, uint32_t count, bool tdi)
@@ -165,7 +166,7 @@ void RbbTransport::flush()
 {
     if (m_out.empty() && m_unanswered == 0) return;
     requireConnection();
-    pump(true);
+    pump(0);
 }
 
 bool RbbTransport::readPin(uint32_t pin, bool& level)
@@ -176,7 +177,7 @@ bool RbbTransport::readPin(uint32_t pin, bool& level)
     m_pinBits = 0;
     addReads(ShiftSink::buffer(&m_pinBits), 0, 1);
     m_out.push_back('R');
-    pump(true);
+    pump(0);
     level = (m_pinBits & 1u) != 0;
     return true;
 }
@@ -185,7 +186,7 @@ void RbbTransport::setResetLines(bool trst, bool srst)
 {
     requireConnection();
     m_out.push_back(static_cast<char>('r' + (trst ? 2 : 0) + (srst ? 1 : 0)));
-    pump(false);
+    pump(UINT64_MAX);
 }
 
 void RbbTransport::sleep(uint32_t microseconds)
@@ -198,10 +199,10 @@ void RbbTransport::sleep(uint32_t microseconds)
     makeRoom();
     m_out.append(microseconds / 1000, 'Z');
     m_out.append(microseconds % 1000, 'z');
-    pump(false);
+    pump(UINT64_MAX);
 }
 
-void RbbTransport::pump(bool allReplies)
+void RbbTransport::pump(uint64_t maxUnanswered)
 {
     m_in.resize(kReceiveSize);
     std::size_t sent = 0;
@@ -218,7 +219,7 @@ void RbbTransport::pump(bool allReplies)
                 progress = progress || n > 0;
             }
             const bool sending = sent < m_out.size();
-            if (!sending && !(allReplies && m_unanswered > 0)) break;
+            if (!sending && m_unanswered <= maxUnanswered) break;
             if (!progress) m_socket.wait(sending, m_timeoutMs);
         }
     } catch (const std::runtime_error& e) {

@@ -9,7 +9,7 @@
 // sent in large writes; replies are read in bulk while sending (so a server
 // that answers before it reads on never blocks us) and written into the
 // shifts' sinks in order.  At most kMaxUnanswered reads are outstanding:
-// the queue is completed before more are added.
+// at that mark replies are taken until half of them have come.
 //
 // Only '0'..'7', 'R', 'Q' and 'r'..'u' are sent, unless remote sleeps are
 // turned on ('Z' for 1 ms, 'z' for 1 us; understood by newer servers only).
@@ -67,9 +67,9 @@ private:
     void clockBit(bool tms, bool tdi, bool read);
     void addReads(const jexcable::ShiftSink& sink, uint64_t offset, uint64_t count);
     void makeRoom();
-    // Sends the queue while taking replies; with allReplies also waits for
-    // every outstanding reply.
-    void pump(bool allReplies);
+    // Sends the queue while taking replies, then goes on taking replies
+    // until at most maxUnanswered reads are outstanding.
+    void pump(uint64_t maxUnanswered);
     void takeReplies(const char* data, std::size_t size);
     [[noreturn]] void broken(const std::string& text);
 
