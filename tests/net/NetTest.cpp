@@ -6,6 +6,7 @@
 #include <gtest/gtest.h>
 
 #include <netinet/in.h>
+#include <poll.h>
 #include <sys/socket.h>
 #include <unistd.h>
 
@@ -235,23 +236,58 @@ TEST_F(NetTest, ServerFaultsFailTheScanClearlyAndTheNextOpenConnectsAfresh)
     }
 }
 
+// A raw client connection to 127.0.0.1:port.
+int rawConnect(const std::string& address)
+{
+    const int fd = ::socket(AF_INET, SOCK_STREAM | SOCK_CLOEXEC, 0);
+    sockaddr_in addr{};
+    addr.sin_family = AF_INET;
+    addr.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
+    addr.sin_port = htons(static_cast<uint16_t>(std::stoi(address.substr(10))));
+    EXPECT_EQ(0, ::connect(fd, reinterpret_cast<sockaddr*>(&addr), sizeof addr));
+    return fd;
+}
+
+// Sends requests and waits (bounded) for `replies` reply bytes.
+std::string exchange(int fd, const std::string& requests, size_t replies)
+{
+    EXPECT_EQ(static_cast<ssize_t>(requests.size()), ::send(fd, requests.data(), requests.size(), MSG_NOSIGNAL));
+    std::string got;
+    while (got.size() < replies) {
+        pollfd p = {fd, POLLIN, 0};
+        char chunk[256];
+        if (::poll(&p, 1, 5000) <= 0) break;
+        const ssize_t n = ::recv(fd, chunk, std::min(sizeof chunk, replies - got.size()), 0);
+        if (n <= 0) break;
+        got.append(chunk, static_cast<size_t>(n));
+    }
+    return got;
+}
+
 TEST_F(NetTest, ServeOutlivesAClientLeavingMidScanAndReleasesTheCableOnSigterm)
 {
     ChildProcess serve({kProgram, "serve", "--chain", kChain, "--arg", "port=net-leave"});
     const std::string address = serve.listeningAddress();
-    {
-        const int fd = ::socket(AF_INET, SOCK_STREAM, 0);
-        sockaddr_in addr{};
-        addr.sin_family = AF_INET;
-        addr.sin_addr.s_addr = htonl(INADDR_LOOPBACK);
-        addr.sin_port = htons(static_cast<uint16_t>(std::stoi(address.substr(10))));
-        ASSERT_EQ(0, ::connect(fd, reinterpret_cast<sockaddr*>(&addr), sizeof addr));
-        // To Shift-DR, then 40 read bits, and gone before the replies.
-        std::string half = "B0426260404";
-        for (int i = 0; i < 40; ++i) half += "0R4";
-        ASSERT_EQ(static_cast<ssize_t>(half.size()), ::send(fd, half.data(), half.size(), MSG_NOSIGNAL));
-        ::close(fd);
+
+    // A client that waits for each read before the rising edge of its bit
+    // (TCK low), and reads again after it (TCK high): device 0's IDCODE
+    // 0x4BA00477 comes out LSB first either way.
+    int fd = rawConnect(address);
+    ASSERT_EQ("", exchange(fd, "2626262626" "04" "26" "04" "04", 0)); // reset, to Shift-DR
+    for (int bit = 0; bit < 8; ++bit) {
+        const std::string expected(2, ((0x77 >> bit) & 1) ? '1' : '0');
+        EXPECT_EQ(expected.substr(0, 1), exchange(fd, "0R", 1)) << "bit " << bit;
+        EXPECT_EQ(expected.substr(1, 1), exchange(fd, "4R", 1)) << "bit " << bit;
     }
+    ::close(fd);
+
+    // To Shift-DR again, 40 read bits, and gone before the replies.
+    fd = rawConnect(address);
+    std::string half = "B262626262604260404";
+    for (int i = 0; i < 40; ++i) half += "0R4";
+    exchange(fd, half, 0);
+    ::close(fd);
+
     ASSERT_EQ(JEX_SUCCESS, open("remote_bitbang", addressArgs(address)));
     expectChainWorks(1);
     JexJtag_target_close(m_handle);
