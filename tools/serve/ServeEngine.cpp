@@ -15,6 +15,7 @@ namespace {
 constexpr uint64_t kMaxQueuedBits = uint64_t(1) << 24;
 constexpr std::size_t kMaxQueuedOps = 4096;
 constexpr std::size_t kMaxOwedReplies = std::size_t(1) << 20;
+constexpr uint32_t kMaxRepeat = uint32_t(1) << 30; // clocks held by one navigation
 
 void check(uint32_t status, const char* what)
 {
@@ -144,7 +145,7 @@ void ServeEngine::rising(bool tms, bool tdi)
     m_lastOp = -1;
     m_lastLevel = true;
     Op* nav = (!m_ops.empty() && !m_ops.back().shift) ? &m_ops.back() : nullptr;
-    if (nav && TapStateTable::holds(m_state, tms)) {
+    if (nav && TapStateTable::holds(m_state, tms) && nav->repeat < kMaxRepeat) {
         ++nav->repeat;
     } else if (nav && nav->repeat == 0 && TapStateTable::distance(nav->from, next) == nav->length + 1 &&
                TapStateTable::hasUniqueShortestPath(nav->from, next)) {
