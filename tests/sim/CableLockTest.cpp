@@ -9,7 +9,7 @@
 #include <sys/wait.h>
 #include <unistd.h>
 
-#include "CableLock.hpp"
+#include "jexjtag/cable/CableLock.hpp"
 #include "support/TestSupport.hpp"
 
 using jexcable::CableLock;
