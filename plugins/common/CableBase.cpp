@@ -39,22 +39,12 @@ bool CableBase::requireOpen()
     return false;
 }
 
-uint32_t CableBase::run(const std::function<void(JtagEngine&)>& work)
+// After clocks, the pins show the levels of the last one, TCK high.
+void CableBase::syncPins()
 {
-    if (!m_engine) return fail("the cable has no transport");
-    const uint64_t before = m_engine->clocks();
-    try {
-        work(*m_engine);
-    } catch (const std::exception& e) {
-        m_engine->forgetState();
-        return fail(e.what());
-    }
-    if (m_engine->clocks() != before) {
-        m_tck = true;
-        m_tms = m_engine->lastTms();
-        m_tdi = m_engine->lastTdi();
-    }
-    return JEX_SUCCESS;
+    m_tck = true;
+    m_tms = m_engine->lastTms();
+    m_tdi = m_engine->lastTdi();
 }
 
 // ---- open and close ------------------------------------------------------------

@@ -20,7 +20,7 @@
 
 namespace jexsim {
 
-class SimChain : public jexcable::JtagTransport {
+class SimChain final : public jexcable::JtagTransport {
 public:
     explicit SimChain(const std::vector<DeviceSpec>& devices);
 

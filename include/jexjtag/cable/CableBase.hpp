@@ -40,7 +40,7 @@
 // used by one session at a time.
 
 #include <cstdint>
-#include <functional>
+#include <exception>
 #include <map>
 #include <memory>
 #include <string>
@@ -175,7 +175,20 @@ protected:
     // Runs `work` on the engine, then updates the pins from its last clock;
     // a transport exception fails with its message (the TAP is reset before
     // the next operation).
-    uint32_t run(const std::function<void(JtagEngine&)>& work);
+    template <typename Work>
+    uint32_t run(Work&& work)
+    {
+        if (!m_engine) return fail("the cable has no transport");
+        const uint64_t before = m_engine->clocks();
+        try {
+            work(*m_engine);
+        } catch (const std::exception& e) {
+            m_engine->forgetState();
+            return fail(e.what());
+        }
+        if (m_engine->clocks() != before) syncPins();
+        return JEX_SUCCESS;
+    }
 
 private:
     struct Target {
@@ -185,6 +198,7 @@ private:
     };
 
     bool requireOpen();
+    void syncPins();
     bool interrogateChain(std::string& error);
     uint32_t shift(Target target, const ShiftSource& in, const ShiftSink& out, uint32_t bitCount,
                    uint32_t exitState, bool needsTdi, bool needsTdo, const void* tdi, const void* tdo);
