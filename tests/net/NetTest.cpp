@@ -155,6 +155,10 @@ TEST_F(NetTest, ClientReadsTheChainOfAnIndependentServerOverTcpAndUnixSockets)
         const std::string address = server.listeningAddress();
         ASSERT_EQ(JEX_SUCCESS, open("remote_bitbang", addressArgs(address)));
         expectChainWorks(1);
+        EXPECT_EQ(JEX_SUCCESS, JexJtag_target_setOption(m_handle, "trst", "1")); // 't' resets the TAPs
+        EXPECT_EQ(JEX_SUCCESS, JexJtag_target_setOption(m_handle, "trst", "0"));
+        EXPECT_EQ(JEX_SUCCESS, JexJtag_tap_interrogateChain(m_handle, 0));
+        EXPECT_EQ("01001011101000000000010001110111", idcode(0));
         EXPECT_EQ(JEX_SUCCESS, JexJtag_target_close(m_handle));
         EXPECT_EQ("", server.errorText()); // only letters of the original protocol were sent
         if (unixSocket) continue;
