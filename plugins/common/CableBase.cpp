@@ -93,7 +93,13 @@ uint32_t CableBase::openTarget(uint32_t argc, const char** argv, JexJtagCallCont
     m_layout.assign({});
     m_transport = nullptr;
     m_engine.reset();
-    if (openCable(PluginArgs(argc, argv)) != JEX_SUCCESS) {
+    uint32_t opened = JEX_FAILURE;
+    try {
+        opened = openCable(PluginArgs(argc, argv));
+    } catch (const std::exception& e) {
+        opened = fail(e.what());
+    }
+    if (opened != JEX_SUCCESS) {
         m_engine.reset();
         m_transport = nullptr;
         return JEX_FAILURE;
@@ -502,7 +508,13 @@ uint32_t CableBase::sendCommand(const char* command, const uint8_t* inBuffer, ui
     if (PluginArgs::equalsIgnoreCase(command, "get")) {
         const std::string key = PluginArgs::toLower(PluginArgs::trim(input));
         std::string value;
-        switch (getOption(key, value)) {
+        OptionStatus answer = OptionStatus::Failed;
+        try {
+            answer = getOption(key, value);
+        } catch (const std::exception& e) {
+            fail(e.what());
+        }
+        switch (answer) {
         case OptionStatus::Failed: return JEX_FAILURE;
         case OptionStatus::Done: break;
         case OptionStatus::Unknown: {
@@ -522,7 +534,13 @@ uint32_t CableBase::sendCommand(const char* command, const uint8_t* inBuffer, ui
         bool known = false;
         const uint32_t common = setCommonOption(key, value, known);
         if (known) return common;
-        switch (setOption(key, value)) {
+        OptionStatus answer = OptionStatus::Failed;
+        try {
+            answer = setOption(key, value);
+        } catch (const std::exception& e) {
+            fail(e.what());
+        }
+        switch (answer) {
         case OptionStatus::Failed: return JEX_FAILURE;
         case OptionStatus::Done: return JEX_SUCCESS;
         case OptionStatus::Unknown: break;
