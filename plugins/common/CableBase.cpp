@@ -445,6 +445,8 @@ uint32_t CableBase::pulsePin(uint32_t pin, uint32_t count)
     if (!requireOpen()) return JEX_FAILURE;
     if (pin == JEXJTAG_TDO) return fail("TDO is an input of the cable and cannot be pulsed");
     bool current = false;
+    if (count == 0 && pin > JEXJTAG_TCK && m_ownPins.count(pin) == 0 && !m_transport->readPin(pin, current))
+        return fail("unknown pin " + std::to_string(pin));
     switch (pin) {
     case JEXJTAG_TCK: current = m_tck; break;
     case JEXJTAG_TMS: current = m_tms; break;
