@@ -285,6 +285,13 @@ TEST_F(NetTest, ServeOutlivesAClientLeavingMidScanAndReleasesTheCableOnSigterm)
     }
     ::close(fd);
 
+    // A request outside the protocol ends that client's connection.
+    fd = rawConnect(address);
+    EXPECT_EQ("", exchange(fd, "04X0R4", 1));
+    char byte = 0;
+    EXPECT_EQ(0, ::recv(fd, &byte, 1, MSG_DONTWAIT)); // closed, not merely silent
+    ::close(fd);
+
     // To Shift-DR again, 40 read bits, and gone before the replies.
     fd = rawConnect(address);
     std::string half = "B262626262604260404";
