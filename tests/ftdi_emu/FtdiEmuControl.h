@@ -17,7 +17,8 @@
  *   JEXJTAG_FTDI_EMU_CONTROL   a file read before every transfer: "unplug"
  *                              unplugs every adapter now, "unplug-after N" after
  *                              N more bulk OUT transfers
- * Adapter i sits on bus 1, port path 2.(i+1), device address i+2.
+ * A later libusb_init() with no device open rebuilds the adapters when these
+ * variables changed.  Adapter i sits on bus 1, port path 2.(i+1), address i+2.
  */
 
 #include <stdint.h>

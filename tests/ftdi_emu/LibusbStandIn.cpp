@@ -63,6 +63,8 @@ struct World {
     std::string lastControl;
     long outBeforeUnplug = -1;
     FtdiEmuCounters counters{};
+    std::string configuration; // the environment the adapters were built from
+    unsigned openHandles = 0;
     std::mutex mutex;
 };
 
@@ -80,42 +82,72 @@ std::vector<std::string> split(const std::string& text, char sep)
     return parts;
 }
 
+std::string configuration()
+{
+    std::string key;
+    for (const char* name : {"JEXJTAG_FTDI_EMU_ADAPTERS", "JEXJTAG_FTDI_EMU_CHAIN", "JEXJTAG_FTDI_EMU_REJECT",
+                             "JEXJTAG_FTDI_EMU_DENY", "JEXJTAG_FTDI_EMU_CONTROL"})
+        key += env(name) + '\n';
+    return key;
+}
+
+// Builds the adapters the environment describes.
+void configure(World& w)
+{
+    w.adapters.clear();
+    w.unplugged = false;
+    w.lastControl.clear();
+    w.outBeforeUnplug = -1;
+    std::vector<jexsim::DeviceSpec> devices;
+    std::string error;
+    if (!jexsim::ChainSpec::parse(env("JEXJTAG_FTDI_EMU_CHAIN", kDefaultChain), devices, error))
+        std::fprintf(stderr, "ftdi emulator: bad JEXJTAG_FTDI_EMU_CHAIN: %s\n", error.c_str());
+    std::set<uint8_t> rejected;
+    for (const std::string& op : split(env("JEXJTAG_FTDI_EMU_REJECT"), ','))
+        rejected.insert(static_cast<uint8_t>(std::strtoul(op.c_str(), nullptr, 16)));
+    for (const std::string& spec : split(env("JEXJTAG_FTDI_EMU_ADAPTERS", kDefaultAdapter), ';')) {
+        const std::vector<std::string> f = split(spec, ':');
+        if (f.size() < 5) {
+            std::fprintf(stderr, "ftdi emulator: bad adapter \"%s\"\n", spec.c_str());
+            continue;
+        }
+        auto a = std::make_unique<Adapter>();
+        a->device.index = w.adapters.size();
+        a->vid = static_cast<uint16_t>(std::strtoul(f[0].c_str(), nullptr, 16));
+        a->pid = static_cast<uint16_t>(std::strtoul(f[1].c_str(), nullptr, 16));
+        a->product = f[3];
+        a->serial = f[4];
+        std::size_t fifo = 4096;
+        bool high = true;
+        if (f[2] == "2232D") {
+            a->bcd = 0x500;
+            a->packetSize = 64;
+            fifo = 384;
+            high = false;
+        } else if (f[2] == "4232H") {
+            a->bcd = 0x800;
+            a->channels = 4;
+            fifo = 2048;
+        } else if (f[2] == "232H") {
+            a->bcd = 0x900;
+            a->channels = 1;
+            fifo = 1024;
+        }
+        a->chain = std::make_unique<jexsim::SimChain>(devices);
+        for (unsigned c = 0; c < a->channels; ++c)
+            a->engines.push_back(std::make_unique<ftdiemu::MpsseEngine>(*a->chain, high, a->packetSize, fifo, rejected));
+        w.adapters.push_back(std::move(a));
+    }
+    w.deny = env("JEXJTAG_FTDI_EMU_DENY") == "1";
+    w.controlPath = env("JEXJTAG_FTDI_EMU_CONTROL");
+    w.configuration = configuration();
+}
+
 World& world()
 {
     static World* w = [] {
         auto* made = new World;
-        std::vector<jexsim::DeviceSpec> devices;
-        std::string error;
-        if (!jexsim::ChainSpec::parse(env("JEXJTAG_FTDI_EMU_CHAIN", kDefaultChain), devices, error))
-            std::fprintf(stderr, "ftdi emulator: bad JEXJTAG_FTDI_EMU_CHAIN: %s\n", error.c_str());
-        std::set<uint8_t> rejected;
-        for (const std::string& op : split(env("JEXJTAG_FTDI_EMU_REJECT"), ','))
-            rejected.insert(static_cast<uint8_t>(std::strtoul(op.c_str(), nullptr, 16)));
-        for (const std::string& spec : split(env("JEXJTAG_FTDI_EMU_ADAPTERS", kDefaultAdapter), ';')) {
-            const std::vector<std::string> f = split(spec, ':');
-            if (f.size() < 5) {
-                std::fprintf(stderr, "ftdi emulator: bad adapter \"%s\"\n", spec.c_str());
-                continue;
-            }
-            auto a = std::make_unique<Adapter>();
-            a->device.index = made->adapters.size();
-            a->vid = static_cast<uint16_t>(std::strtoul(f[0].c_str(), nullptr, 16));
-            a->pid = static_cast<uint16_t>(std::strtoul(f[1].c_str(), nullptr, 16));
-            a->product = f[3];
-            a->serial = f[4];
-            std::size_t fifo = 4096;
-            bool high = true;
-            if (f[2] == "2232D") { a->bcd = 0x500; a->packetSize = 64; fifo = 384; high = false; }
-            else if (f[2] == "4232H") { a->bcd = 0x800; a->channels = 4; fifo = 2048; }
-            else if (f[2] == "232H") { a->bcd = 0x900; a->channels = 1; fifo = 1024; }
-            a->chain = std::make_unique<jexsim::SimChain>(devices);
-            for (unsigned c = 0; c < a->channels; ++c)
-                a->engines.push_back(
-                    std::make_unique<ftdiemu::MpsseEngine>(*a->chain, high, a->packetSize, fifo, rejected));
-            made->adapters.push_back(std::move(a));
-        }
-        made->deny = env("JEXJTAG_FTDI_EMU_DENY") == "1";
-        made->controlPath = env("JEXJTAG_FTDI_EMU_CONTROL");
+        configure(*made);
         return made;
     }();
     return *w;
@@ -177,9 +209,15 @@ EMU_API int jexjtag_ftdi_emu_channel(unsigned adapter, unsigned channel, FtdiEmu
 
 // ---- libusb: context and devices -------------------------------------------------------------------
 
+// A new context sees a changed environment (tests set it between cases)
+// unless a device is open.
 EMU_API int libusb_init(libusb_context** ctx)
 {
-    world();
+    World& w = world();
+    {
+        std::lock_guard<std::mutex> lock(w.mutex);
+        if (w.openHandles == 0 && configuration() != w.configuration) configure(w);
+    }
     if (ctx) *ctx = new libusb_context{0};
     return LIBUSB_SUCCESS;
 }
@@ -308,11 +346,15 @@ EMU_API int libusb_open(libusb_device* dev, libusb_device_handle** handle)
     if (!present(w)) return LIBUSB_ERROR_NO_DEVICE;
     if (w.deny) return LIBUSB_ERROR_ACCESS;
     *handle = new libusb_device_handle{dev};
+    ++w.openHandles;
     return LIBUSB_SUCCESS;
 }
 
 EMU_API void libusb_close(libusb_device_handle* handle)
 {
+    World& w = world();
+    std::lock_guard<std::mutex> lock(w.mutex);
+    --w.openHandles;
     delete handle;
 }
 
