@@ -74,11 +74,15 @@ std::string env(const char* name, const char* fallback = "")
     return v && *v ? v : fallback;
 }
 
+// Splits at every `sep`, keeping empty fields ("a::" is three fields).
 std::vector<std::string> split(const std::string& text, char sep)
 {
     std::vector<std::string> parts;
-    std::stringstream in(text);
-    for (std::string part; std::getline(in, part, sep);) parts.push_back(part);
+    if (text.empty()) return parts;
+    std::size_t start = 0;
+    for (std::size_t at; (at = text.find(sep, start)) != std::string::npos; start = at + 1)
+        parts.push_back(text.substr(start, at - start));
+    parts.push_back(text.substr(start));
     return parts;
 }
 
@@ -266,7 +270,7 @@ EMU_API int libusb_get_device_descriptor(libusb_device* dev, libusb_device_descr
     desc->bcdDevice = a.bcd;
     desc->iManufacturer = 1;
     desc->iProduct = 2;
-    desc->iSerialNumber = 3;
+    desc->iSerialNumber = a.serial.empty() ? 0 : 3;
     desc->bNumConfigurations = 1;
     return LIBUSB_SUCCESS;
 }
