@@ -146,6 +146,9 @@ std::unique_ptr<LibFtdiLink> LibFtdiLink::open(const UsbDevice& device, char cha
         error = link->m_chip + " has no MPSSE engine on channel " + channel;
         return nullptr;
     }
+    // Bounds on every bulk transfer (libftdi1's default is 5 s each).
+    ctx->usb_read_timeout = 1000;
+    ctx->usb_write_timeout = 2000;
     ftdi_write_data_set_chunksize(ctx, 64 * 1024);
     ftdi_read_data_set_chunksize(ctx, 16 * 1024);
     if (ftdi_usb_reset(ctx) < 0 || ftdi_set_bitmode(ctx, 0, BITMODE_RESET) < 0 || ftdi_tcioflush(ctx) < 0 ||

@@ -5,8 +5,8 @@
 //
 // Opening resets the channel, purges both FIFOs, sets the latency timer
 // and switches the channel to MPSSE mode; closing (the destructor) returns
-// it to its reset mode.  Every wait is bounded: USB transfers by libftdi1's
-// timeouts (5 s), reads of expected answers by the caller's timeout.
+// it to its reset mode.  Every wait is bounded: each bulk transfer by 1 s
+// (IN) or 2 s (OUT), reads of expected answers by the caller's timeout.
 // Failures are reported in words a user can act on: no device, permission
 // (naming the udev rule), the device in use, unplugged.
 
