@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: MIT
 #include "AdapterProfile.hpp"
 
-#include "PluginArgs.hpp"
+#include "jexjtag/cable/PluginArgs.hpp"
 
 namespace jexusb {
 

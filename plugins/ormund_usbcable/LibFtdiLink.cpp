@@ -7,7 +7,7 @@
 #include <algorithm>
 #include <chrono>
 
-#include "PluginPlatform.hpp"
+#include "jexjtag/cable/PluginPlatform.hpp"
 
 namespace jexusb {
 

@@ -33,8 +33,8 @@
 #include <vector>
 
 #include "FtdiLink.hpp"
-#include "ShiftSink.hpp"
-#include "ShiftSource.hpp"
+#include "jexjtag/cable/ShiftSink.hpp"
+#include "jexjtag/cable/ShiftSource.hpp"
 
 namespace jexusb {
 

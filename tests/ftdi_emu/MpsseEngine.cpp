@@ -4,8 +4,8 @@
 #include <algorithm>
 #include <cstring>
 
-#include "ShiftSink.hpp"
-#include "ShiftSource.hpp"
+#include "jexjtag/cable/ShiftSink.hpp"
+#include "jexjtag/cable/ShiftSource.hpp"
 
 namespace ftdiemu {
 
