@@ -244,6 +244,11 @@ void MpsseQueue::shift(const ShiftSource& in, const ShiftSink& out, uint64_t cou
 void MpsseQueue::fail(const std::string& text)
 {
     if (m_error.empty()) m_error = text.empty() ? std::string("USB transfer failed") : text;
+    drop();
+}
+
+void MpsseQueue::drop()
+{
     m_out.clear();
     m_answers.clear();
     m_answerBytes = 0;
@@ -254,8 +259,7 @@ void MpsseQueue::fail(const std::string& text)
 void MpsseQueue::clearError()
 {
     m_error.clear();
-    fail("");
-    m_error.clear();
+    drop();
 }
 
 bool MpsseQueue::flush()

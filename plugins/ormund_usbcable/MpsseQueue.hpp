@@ -124,6 +124,7 @@ private:
     void room(std::size_t commandBytes, std::size_t answerBytes);
     void expect(Kind kind, uint32_t count, const jexcable::ShiftSink& sink, uint64_t offset, uint8_t* raw);
     void fail(const std::string& text);
+    void drop(); // forgets everything queued
     bool transact();
     void scatter();
 
