@@ -26,6 +26,8 @@ constexpr uint8_t kSetHigh = 0x82;
 constexpr uint8_t kGetHigh = 0x83;
 constexpr uint8_t kDivisor = 0x86;
 constexpr uint8_t kSendImmediate = 0x87;
+constexpr uint8_t kClockBits = 0x8E;  // 1-8 TCK pulses, no data (H chips)
+constexpr uint8_t kClockBytes = 0x8F; // 8 to 524288 TCK pulses, no data (H chips)
 constexpr uint8_t kDivBy5Off = 0x8A;
 constexpr uint8_t kDivBy5On = 0x8B;
 constexpr uint8_t kThreePhaseOff = 0x8D;
@@ -182,6 +184,27 @@ void MpsseQueue::clockTms(bool tms, bool tdi)
     m_tms = tms;
     m_tdi = tdi;
     if (m_tmsCount == 7) emitTms();
+}
+
+void MpsseQueue::holdClocks(uint64_t count, bool tms, bool tdi)
+{
+    if (!ok() || count == 0) return;
+    if (!m_highSpeed || tms != m_tms) {
+        for (uint64_t i = 0; i < count && ok(); ++i) clockTms(tms, tdi);
+        return;
+    }
+    emitTms();
+    driveTdi(tdi);
+    for (uint64_t bytes = count / 8; bytes > 0;) {
+        const uint64_t n = std::min<uint64_t>(bytes, 65536);
+        room(3, 0);
+        m_out.insert(m_out.end(), {kClockBytes, static_cast<uint8_t>((n - 1) & 0xFF), static_cast<uint8_t>((n - 1) >> 8)});
+        bytes -= n;
+    }
+    if (const auto rest = static_cast<unsigned>(count % 8); rest > 0) {
+        room(2, 0);
+        m_out.insert(m_out.end(), {kClockBits, static_cast<uint8_t>(rest - 1)});
+    }
 }
 
 void MpsseQueue::shift(const ShiftSource& in, const ShiftSink& out, uint64_t count, bool tmsOnLast,

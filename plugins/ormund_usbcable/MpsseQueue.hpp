@@ -90,6 +90,10 @@ public:
     // One TCK cycle with these TMS and TDI levels; consecutive cycles with
     // the same TDI share one TMS command.
     void clockTms(bool tms, bool tdi);
+    // `count` cycles with TMS and TDI held at these levels.  H chips clock
+    // them without data (0x8F: 8 clocks a byte count, 0x8E: 1-8 clocks);
+    // the FT2232D gets TMS commands.
+    void holdClocks(uint64_t count, bool tms, bool tdi);
     // `count` cycles of a scan (TMS low), the last one with TMS = tmsOnLast.
     // TDI bit i comes from in.bit(i); TDO of cycle i goes to bit
     // (sinkOffset + i) of `out` (nothing is read when !out.wanted()).

@@ -33,6 +33,11 @@ void MpsseTransport::shift(const ShiftSource& in, const ShiftSink& out, uint32_t
     m_queue->shift(in, out, count, tmsOnLast);
 }
 
+void MpsseTransport::idleClocks(uint64_t count, bool tms, bool tdi)
+{
+    m_queue->holdClocks(count, tms, tdi);
+}
+
 void MpsseTransport::flush()
 {
     if (m_queue->flush()) return;

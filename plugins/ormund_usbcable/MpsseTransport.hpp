@@ -35,6 +35,7 @@ public:
     void moveTms(const uint8_t* tms, uint32_t count, bool tdi) override;
     void shift(const jexcable::ShiftSource& in, const jexcable::ShiftSink& out, uint32_t count,
                bool tmsOnLast) override;
+    void idleClocks(uint64_t count, bool tms, bool tdi) override;
     void flush() override;
     bool drivePin(uint32_t pin, bool level) override;
     bool readPin(uint32_t pin, bool& level) override;
