@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: MIT
 #include "svf/SvfLexer.hpp"
 
+#include <algorithm>
 #include <array>
 
 #include "svf/SvfError.hpp"
@@ -124,15 +125,24 @@ SvfLexer::Token SvfLexer::next()
 
 void SvfLexer::readHex(std::vector<uint8_t>& digits)
 {
-    digits.clear();
+    // digits is grown ahead of the writes (by at least one chunk) and cut
+    // to the count at the end: no per-digit bookkeeping in the loop.
+    size_t n = 0;
     for (;;) {
-        if (m_p == m_end && !fill()) fail("scan data without ')' at the end of the file");
+        if (m_p == m_end && !fill()) {
+            digits.resize(n);
+            fail("scan data without ')' at the end of the file");
+        }
         const char* p = m_p;
         const char* const end = m_end;
+        const size_t room = n + static_cast<size_t>(end - p);
+        if (digits.size() < room) digits.resize(std::max(room, digits.size() * 2));
+        uint8_t* out = digits.data();
         while (p < end) {
             const int8_t k = classOf(*p);
             if (k >= 0) {
-                if (k != 0 || !digits.empty()) digits.push_back(static_cast<uint8_t>(k));
+                out[n] = static_cast<uint8_t>(k);
+                n += (k != 0 || n != 0); // leading zeros are dropped
                 ++p;
                 continue;
             }
@@ -146,7 +156,10 @@ void SvfLexer::readHex(std::vector<uint8_t>& digits)
                 continue;
             }
             m_p = p + 1;
-            if (k == kClose) return;
+            if (k == kClose) {
+                digits.resize(n);
+                return;
+            }
             if (k == kBang) {
                 m_p = p;
                 skipComment();
