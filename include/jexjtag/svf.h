@@ -22,9 +22,11 @@
  * cable runs faster; a FREQUENCY above the cable's speed is a warning.  The
  * cable's frequency is put back at the end.
  *
- * Errors and warnings also go to the session as messages
- * ("<file>:<line>: <text>"), errors as JEX_MSG_ERROR, warnings as
- * JEX_MSG_WARNING.
+ * Warnings go to the session as JEX_MSG_WARNING messages
+ * ("<file>:<line>: <text>"): a FREQUENCY above the cable's, a cable without
+ * TRST, and with JEXJTAG_SVF_KEEP_GOING every TDO mismatch.  What stopped or
+ * failed the play is written to the result's message; it goes to the session
+ * as a JEX_MSG_ERROR message only when the caller gave no message buffer.
  */
 #ifndef JEXJTAG_SVF_H
 #define JEXJTAG_SVF_H
@@ -88,7 +90,8 @@ typedef struct JexJtagSvfResult {
     char*    mask;              /* caller's buffer: the MASK in effect */
     uint32_t messageSize;
     uint32_t reserved;          /* set to 0 */
-    char*    message;           /* caller's buffer: "<file>:<line>: <text>" of the error, "" when none */
+    char*    message;           /* caller's buffer: "<file>:<line>: <text>" of the error, else of the
+                                   first mismatch; "" when the play passed */
 } JexJtagSvfResult;
 
 JEXJTAG_STATIC_ASSERT(offsetof(JexJtagSvfResult, statements) == 0, "JexJtagSvfResult.statements");
@@ -108,7 +111,7 @@ JEXJTAG_API uint32_t JexJtag_svf_initOptions(JexJtagSvfOptions* options);
  * result may be null, else its counters and texts are written (the caller's
  * buffer pointers and capacities are kept).  JEX_SUCCESS when the whole file
  * played and every TDO check passed; JEX_FAILURE otherwise, with the reason
- * in result->outcome and an error message to the session. */
+ * in result->outcome and result->message. */
 JEXJTAG_API uint32_t JexJtag_svf_playFile(unsigned handle, const char* path, const JexJtagSvfOptions* options,
                                           JexJtagSvfResult* result);
 

@@ -58,8 +58,9 @@ unsigned play(const char* function, unsigned handle, const std::string& name, co
         Logger::logger.printLog(3, "%s() handle=%u, name=%s, flags=0x%x, maxFrequencyHz=%.0f\n", function, handle,
                                 name.c_str(), o.flags, o.maxFrequencyHz);
 
+    const bool textTaken = result && result->message && result->messageSize > 0;
     auto fail = [&](JexJtagSvfOutcome outcome, const std::string& text) {
-        session->sendMessage(JEX_MSG_ERROR, text);
+        if (!textTaken) session->sendMessage(JEX_MSG_ERROR, text);
         if (result) {
             result->outcome = outcome;
             copyCut(result->message, result->messageSize, text);
@@ -100,6 +101,7 @@ unsigned play(const char* function, unsigned handle, const std::string& name, co
         copyCut(result->mask, result->maskSize, player.firstMismatch().mask);
         copyCut(result->message, result->messageSize, player.errorText());
     }
+    if (!textTaken && !player.errorText().empty()) session->sendMessage(JEX_MSG_ERROR, player.errorText());
     Logger::logger.printLog(3, "%s() statements=%llu, checks=%llu, mismatches=%llu, outcome=%u\n", function,
                             static_cast<unsigned long long>(player.statements()),
                             static_cast<unsigned long long>(player.checks()),

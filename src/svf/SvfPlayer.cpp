@@ -6,6 +6,7 @@
 #include <cmath>
 #include <cstdlib>
 #include <memory>
+#include <new>
 #include <utility>
 
 #include "session/Session.hpp"
@@ -86,13 +87,21 @@ JexJtagSvfOutcome SvfPlayer::play(SvfInput& input)
         }
         m_state = JEXJTAG_TEST_LOGIC_RESET;
         while (!m_stop && parser.read(*statement)) {
+            m_line = statement->line;
             run(*statement);
             ++m_statements;
         }
         if (m_target) check(m_target->flush(), 0, "to flush");
         restoreFrequency();
         progress(lexer.offset(), true);
-        if (m_mismatches) outcome = JEXJTAG_SVF_MISMATCH;
+        if (m_mismatches) {
+            outcome = JEXJTAG_SVF_MISMATCH;
+            m_errorText = m_firstText;
+        }
+    } catch (const std::bad_alloc&) {
+        outcome = JEXJTAG_SVF_BAD_FILE;
+        m_errorLine = m_line;
+        m_errorText = m_name + ":" + std::to_string(m_line) + ": out of memory for the vectors of this statement";
     } catch (const SvfError& e) {
         try {
             restoreFrequency();
@@ -105,7 +114,6 @@ JexJtagSvfOutcome SvfPlayer::play(SvfInput& input)
         }
         m_errorLine = e.line();
         m_errorText = m_name + (e.line() ? ":" + std::to_string(e.line()) : std::string()) + ": " + e.what();
-        if (m_session) m_session->sendMessage(JEX_MSG_ERROR, m_errorText);
     }
     return outcome;
 }
@@ -227,9 +235,12 @@ void SvfPlayer::scan(bool ir, const SvfStatement& s)
     const std::string text = "TDO mismatch: expected " + found.expected.substr(0, 80) + " got " +
                              found.actual.substr(0, 80) + " mask " + found.mask.substr(0, 80) + " (first at bit " +
                              std::to_string(bad) + ")";
-    if (m_mismatches == 1) m_first = std::move(found);
-    message(m_options.keepGoing ? JEX_MSG_WARNING : JEX_MSG_ERROR, s.line, text);
-    if (!m_options.keepGoing) m_stop = true;
+    if (m_mismatches == 1) {
+        m_first = std::move(found);
+        m_firstText = m_name + ":" + std::to_string(s.line) + ": " + text;
+    }
+    if (m_options.keepGoing) message(JEX_MSG_WARNING, s.line, text);
+    else m_stop = true;
 }
 
 void SvfPlayer::moveTo(uint64_t line, unsigned stable)

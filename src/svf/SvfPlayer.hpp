@@ -8,7 +8,8 @@
 //
 // The TAP is reset (TMS high) before the first statement.  Scans with
 // header and trailer become one whole-chain shift of the composite vector.
-// Warnings and errors go to the session as "<name>:<line>: <text>".
+// Warnings (and, when keeping going, each TDO mismatch) go to the session as
+// "<name>:<line>: <text>"; what stopped play is kept in errorText().
 
 #include <cstdint>
 #include <string>
@@ -51,7 +52,8 @@ public:
     uint64_t mismatches() const { return m_mismatches; }
     const Mismatch& firstMismatch() const { return m_first; }
     uint64_t errorLine() const { return m_errorLine; }
-    // "<name>:<line>: <text>" of the error that stopped play, "" when none.
+    // "<name>:<line>: <text>": the error that stopped play, else the first
+    // TDO mismatch; "" when the play passed.
     const std::string& errorText() const { return m_errorText; }
 
 private:
@@ -96,7 +98,9 @@ private:
     bool m_stop = false;
     Mismatch m_first;
     uint64_t m_errorLine = 0;
+    uint64_t m_line = 0; // of the statement running
     std::string m_errorText;
+    std::string m_firstText;
 };
 
 } // namespace JexRT

@@ -149,7 +149,8 @@ TEST_F(SvfPlayTest, MismatchDetailsKeepGoingAndCutTexts)
     EXPECT_STREQ("3BA00477", texts.expected);
     EXPECT_STREQ("4BA00477", texts.actual);
     EXPECT_STREQ("FFFFFFFF", texts.mask);
-    EXPECT_STREQ("", texts.message) << "a mismatch is no error";
+    EXPECT_EQ(file + ":10: TDO mismatch: expected 3BA00477 got 4BA00477 mask FFFFFFFF (first at bit 28)",
+              std::string(texts.message));
     const auto warnings = messagesOfType(JEX_MSG_WARNING);
     ASSERT_EQ(1u, warnings.size());
     EXPECT_EQ(file + ":10: TDO mismatch: expected 3BA00477 got 4BA00477 mask FFFFFFFF (first at bit 28)", warnings[0]);
@@ -167,6 +168,8 @@ TEST_F(SvfPlayTest, MismatchDetailsKeepGoingAndCutTexts)
     EXPECT_EQ(2u, cut.checks);
     EXPECT_EQ(3u, std::strlen(small[0]));
     EXPECT_EQ(3u, std::strlen(small[1]));
+    ASSERT_EQ(1u, messagesOfType(JEX_MSG_ERROR).size()) << "no message buffer: the reason goes to the session";
+    EXPECT_TRUE(contains(messagesOfType(JEX_MSG_ERROR)[0], file + ":10: TDO mismatch"));
 }
 
 TEST_F(SvfPlayTest, GeneratedMultiMegabitSdrWithProgressAndCancel)
