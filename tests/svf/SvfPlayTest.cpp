@@ -197,12 +197,12 @@ TEST_F(SvfPlayTest, GeneratedMultiMegabitSdrWithProgressAndCancel)
     JexJtag_svf_initOptions(&options);
     options.progressUser = &progress;
     options.progress = [](void* user, uint64_t done, uint64_t total, uint64_t statements) {
-        auto* p = static_cast<Progress*>(user);
-        ++p->calls;
-        p->lastDone = done;
-        p->total = total;
-        p->statements = statements;
-        return p->calls == p->cancelAt ? 1 : 0;
+        auto* seen = static_cast<Progress*>(user);
+        ++seen->calls;
+        seen->lastDone = done;
+        seen->total = total;
+        seen->statements = statements;
+        return seen->calls == seen->cancelAt ? 1 : 0;
     };
     JexJtagSvfResult r{};
     EXPECT_EQ(JEX_SUCCESS, JexJtag_svf_playText(m_handle, text.data(), text.size(), "big", &options, &r));
