@@ -69,9 +69,10 @@ void SvfParser::expectSemicolon(const char* after)
     m_lexer->fail(std::string("expected ';' after ") + after);
 }
 
-uint32_t SvfParser::integer(const char* what)
+uint32_t SvfParser::integer(const char* what) { return integer(what, m_lexer->word()); }
+
+uint32_t SvfParser::integer(const char* what, const std::string& w)
 {
-    const std::string& w = m_lexer->word();
     uint64_t value = 0;
     bool ok = !w.empty() && w.size() <= 10;
     for (char c : w) {
@@ -82,9 +83,10 @@ uint32_t SvfParser::integer(const char* what)
     return static_cast<uint32_t>(value);
 }
 
-double SvfParser::real(const char* what)
+double SvfParser::real(const char* what) { return real(what, m_lexer->word()); }
+
+double SvfParser::real(const char* what, const std::string& w)
 {
-    const std::string& w = m_lexer->word();
     if (!isReal(w)) m_lexer->fail(std::string(what) + " '" + w + "' is not a number");
     const double value = std::strtod(w.c_str(), nullptr);
     if (!std::isfinite(value)) m_lexer->fail(std::string(what) + " '" + w + "' is out of range");
@@ -212,16 +214,8 @@ void SvfParser::readRunTest(SvfStatement& out)
     SvfLexer::Token t;
     if (unit == "TCK" || unit == "SCK") {
         if (unit == "SCK") m_lexer->fail("RUNTEST with SCK is not supported (no system clock on a JTAG cable)");
-        // integer() reads the lexer's word: put the count back through a check of its own.
-        uint64_t value = 0;
-        bool ok = number.size() <= 10;
-        for (char c : number) {
-            if (c < '0' || c > '9') ok = false;
-            else value = value * 10 + static_cast<unsigned>(c - '0');
-        }
-        if (!ok || value > UINT32_MAX) m_lexer->fail("run count '" + number + "' is not a decimal number up to 4294967295");
         out.hasCount = true;
-        out.runCount = static_cast<uint32_t>(value);
+        out.runCount = integer("run count", number);
         t = m_lexer->next();
         if (t == SvfLexer::Token::Word && isNumberStart(m_lexer->word())) {
             out.minTime = real("minimum time");
@@ -230,8 +224,7 @@ void SvfParser::readRunTest(SvfStatement& out)
             t = m_lexer->next();
         }
     } else if (unit == "SEC") {
-        if (!isReal(number)) m_lexer->fail("minimum time '" + number + "' is not a number");
-        out.minTime = std::strtod(number.c_str(), nullptr);
+        out.minTime = real("minimum time", number);
         t = m_lexer->next();
     } else {
         m_lexer->fail("expected TCK, SCK or SEC, not '" + unit + "'");

@@ -6,6 +6,7 @@
 // refused.  Errors are SvfError(BadFile) on the statement's first line.
 
 #include <cstdint>
+#include <string>
 #include <vector>
 
 #include "svf/SvfStatement.hpp"
@@ -27,8 +28,11 @@ private:
     unsigned stableState(const char* what);
     void expectSemicolon(const char* after);
     void expectWord(const char* what);
+    // The lexer's last word (or `text`) as a decimal count, or a real number.
     uint32_t integer(const char* what);
+    uint32_t integer(const char* what, const std::string& text);
     double real(const char* what);
+    double real(const char* what, const std::string& text);
 
     SvfLexer* m_lexer;
     std::vector<uint8_t> m_digits;
