@@ -141,7 +141,7 @@ agree() {
     if [ $have_rbb = yes ]; then
         b=$(seen ours "$1" "$3" "$4")
         [ "$b" = "$want" ] || problems="$problems jexjtag through remote_bitbang '$b';"
-        if [ "$want" != error ] && ! cmp -s "$work/seen.oocd" "$work/seen.ours"; then
+        if [ "$want" != error ] && [ -z "${6:-}" ] && ! cmp -s "$work/seen.oocd" "$work/seen.ours"; then
             problems="$problems the devices saw different things: $(diff "$work/seen.oocd" "$work/seen.ours" | head -n 6 | tr '\n' ' ');"
         fi
     fi
