@@ -9,6 +9,9 @@
  * checks the whole text in one pass without touching the cable.  Memory
  * grows with the largest vector of the file, not with the file.
  *
+ * Before the first statement the TAP is reset with TMS (as OpenOCD's player
+ * does), so play starts from Test-Logic-Reset whatever came before.
+ *
  * Scans: HIR/SIR/TIR (HDR/SDR/TDR) become one whole-chain shift of the
  * composite vector, header bits shifted first.  TDO is compared under MASK;
  * header and trailer bits only when their own statement gave a TDO.  SMASK
@@ -73,7 +76,8 @@ typedef enum JexJtagSvfOutcome {
  * Vectors are hexadecimal, most significant digit first, as SVF writes them:
  * the statement's own bits (the whole composite vector when a header or
  * trailer statement gave a TDO).  A vector that does not fit is shown as the
- * window of digits around firstMismatchBit, with "..." on each cut side. */
+ * window of digits around firstMismatchBit, with "..." on each cut side
+ * (buffers of 8 bytes or more). */
 typedef struct JexJtagSvfResult {
     uint64_t statements;        /* statements run (checked, in a dry run) */
     uint64_t checks;            /* scans whose TDO was compared */

@@ -31,6 +31,13 @@ void copyCut(char* buf, uint32_t size, const std::string& text)
     buf[n] = '\0';
 }
 
+// A vector as hex text in buf: whole when it fits, else the digits around
+// bit `focus` that fit, marked "..." where cut.
+void copyHex(char* buf, uint32_t size, const SvfBits& bits, uint64_t focus)
+{
+    if (buf && size > 0) copyCut(buf, size, bits.hex(size - 1, focus));
+}
+
 void clearResult(JexJtagSvfResult* r)
 {
     if (!r) return;
@@ -84,8 +91,6 @@ unsigned play(const char* function, unsigned handle, const std::string& name, co
     playerOptions.maxHz = o.maxFrequencyHz > 0 ? o.maxFrequencyHz : 0;
     playerOptions.progress = o.progress;
     playerOptions.progressUser = o.progressUser;
-    if (result)
-        playerOptions.textLimit = std::max({result->expectedSize, result->actualSize, result->maskSize, 1u}) - 1;
     SvfPlayer player(session, target, handle, name, playerOptions);
     const JexJtagSvfOutcome outcome = player.play(*input);
     if (result) {
@@ -96,9 +101,12 @@ unsigned play(const char* function, unsigned handle, const std::string& name, co
         result->firstMismatchBit = player.firstMismatch().bit;
         result->errorLine = player.errorLine();
         result->outcome = outcome;
-        copyCut(result->expected, result->expectedSize, player.firstMismatch().expected);
-        copyCut(result->actual, result->actualSize, player.firstMismatch().actual);
-        copyCut(result->mask, result->maskSize, player.firstMismatch().mask);
+        const SvfPlayer::Mismatch& first = player.firstMismatch();
+        if (first.line) {
+            copyHex(result->expected, result->expectedSize, first.expected, first.bit);
+            copyHex(result->actual, result->actualSize, first.actual, first.bit);
+            copyHex(result->mask, result->maskSize, first.mask, first.bit);
+        }
         copyCut(result->message, result->messageSize, player.errorText());
     }
     if (!textTaken && !player.errorText().empty()) session->sendMessage(JEX_MSG_ERROR, player.errorText());

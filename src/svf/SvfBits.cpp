@@ -91,8 +91,9 @@ std::string SvfBits::hex(size_t maxChars, uint64_t focus) const
     const size_t digits = std::max<size_t>(1, (static_cast<size_t>(m_bits) + 3) / 4);
     size_t lo = 0;
     size_t hi = digits; // digit positions [lo, hi), position 0 is the rightmost
+    const bool marked = maxChars >= 8;
     if (digits > maxChars) {
-        const size_t keep = maxChars > 6 ? maxChars - 6 : 1;
+        const size_t keep = std::max<size_t>(1, marked ? maxChars - 6 : maxChars);
         const size_t centre = std::min<size_t>(focus / 4, digits - 1);
         lo = centre > keep / 2 ? centre - keep / 2 : 0;
         hi = std::min(digits, lo + keep);
@@ -100,13 +101,13 @@ std::string SvfBits::hex(size_t maxChars, uint64_t focus) const
     }
     std::string text;
     text.reserve(hi - lo + 6);
-    if (hi < digits) text += "...";
+    if (hi < digits && marked) text += "...";
     for (size_t pos = hi; pos-- > lo;) {
         const size_t byte = pos / 2;
         const unsigned v = byte < m_bytes.size() ? (m_bytes[byte] >> ((pos % 2) * 4)) & 0xF : 0;
         text += kDigits[v];
     }
-    if (lo > 0) text += "...";
+    if (lo > 0 && marked) text += "...";
     return text;
 }
 

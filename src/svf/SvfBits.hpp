@@ -33,7 +33,7 @@ public:
     static int64_t firstMismatch(const uint8_t* a, const uint8_t* e, const uint8_t* m, uint32_t bits);
     // The bits as SVF hex text.  When the text needs more than maxChars
     // characters, the window of digits around bit `focus`, marked "..." on
-    // each side that was cut.
+    // each side that was cut (no marks when maxChars is below 8).
     std::string hex(size_t maxChars = SIZE_MAX, uint64_t focus = 0) const;
 
 private:

@@ -221,19 +221,18 @@ void SvfPlayer::scan(bool ir, const SvfStatement& s)
     const int64_t bad = SvfBits::firstMismatch(a, e, m, span);
     if (bad < 0) return;
     ++m_mismatches;
-    SvfBits copy[3];
-    const uint8_t* sources[3] = {e, a, m};
-    for (int i = 0; i < 3; ++i) copy[i].assignSlice(sources[i], 0, span);
+    Mismatch found;
+    found.line = s.line;
+    found.bit = static_cast<uint64_t>(bad);
+    found.expected.assignSlice(e, 0, span);
+    found.actual.assignSlice(a, 0, span);
+    found.mask.assignSlice(m, 0, span);
     // The message shows at most 64 digits of each, around the first difference.
-    const auto focus = static_cast<uint64_t>(bad);
-    const std::string text = "TDO mismatch: expected " + copy[0].hex(64, focus) + " got " + copy[1].hex(64, focus) +
-                             " mask " + copy[2].hex(64, focus) + " (first at bit " + std::to_string(bad) + ")";
+    const std::string text = "TDO mismatch: expected " + found.expected.hex(64, found.bit) + " got " +
+                             found.actual.hex(64, found.bit) + " mask " + found.mask.hex(64, found.bit) +
+                             " (first at bit " + std::to_string(bad) + ")";
     if (m_mismatches == 1) {
-        m_first.line = s.line;
-        m_first.bit = focus;
-        m_first.expected = copy[0].hex(m_options.textLimit, focus);
-        m_first.actual = copy[1].hex(m_options.textLimit, focus);
-        m_first.mask = copy[2].hex(m_options.textLimit, focus);
+        m_first = std::move(found);
         m_firstText = m_name + ":" + std::to_string(s.line) + ": " + text;
     }
     if (m_options.keepGoing) message(JEX_MSG_WARNING, s.line, text);

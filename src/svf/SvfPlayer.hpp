@@ -32,13 +32,13 @@ public:
         double maxHz = 0;
         JexJtagSvfProgress progress = nullptr;
         void* progressUser = nullptr;
-        // Longest hex texts kept of the first mismatch.
-        size_t textLimit = 4096;
     };
+    // The first TDO mismatch: its line, the first differing bit, and the
+    // compared vectors (SvfBits::hex prints them).
     struct Mismatch {
         uint64_t line = 0;
         uint64_t bit = 0;
-        std::string expected, actual, mask;
+        SvfBits expected, actual, mask;
     };
 
     // target null: a dry run.  session (may be null) receives the messages.

@@ -10,7 +10,9 @@
 #include <cstring>
 #include <filesystem>
 #include <fstream>
+#include <functional>
 #include <map>
+#include <numeric>
 #include <sstream>
 #include <string>
 #include <vector>
@@ -166,8 +168,8 @@ TEST_F(SvfPlayTest, MismatchDetailsKeepGoingAndCutTexts)
     cut.maskSize = 4;
     EXPECT_EQ(JEX_FAILURE, play(file, 0, cut));
     EXPECT_EQ(2u, cut.checks);
-    EXPECT_EQ(3u, std::strlen(small[0]));
-    EXPECT_EQ(3u, std::strlen(small[1]));
+    EXPECT_STREQ("3BA", small[0]) << "the digits around the first difference (bit 28)";
+    EXPECT_STREQ("4BA", small[1]);
     ASSERT_EQ(1u, messagesOfType(JEX_MSG_ERROR).size()) << "no message buffer: the reason goes to the session";
     EXPECT_TRUE(contains(messagesOfType(JEX_MSG_ERROR)[0], file + ":10: TDO mismatch"));
 }
@@ -217,9 +219,19 @@ TEST_F(SvfPlayTest, GeneratedMultiMegabitSdrWithProgressAndCancel)
     std::string wrong = text;
     const size_t tdo = wrong.find("TDO (") + 5 + 500000;
     wrong[tdo] = wrong[tdo] == '0' ? '1' : '0';
+    Texts texts;
+    r = resultFor(texts);
+    r.expectedSize = r.actualSize = 20;
     EXPECT_EQ(JEX_FAILURE, JexJtag_svf_playText(m_handle, wrong.data(), wrong.size(), "big", nullptr, &r));
     EXPECT_EQ(unsigned{JEXJTAG_SVF_MISMATCH}, r.outcome);
     EXPECT_EQ(3u, r.firstMismatchLine);
+    // 19 characters: "..." + 13 digits around the differing bit + "..."; they differ in one digit.
+    const std::string expected = texts.expected, actual = texts.actual;
+    ASSERT_EQ(19u, expected.size()) << expected;
+    EXPECT_EQ("...", expected.substr(0, 3));
+    EXPECT_EQ("...", expected.substr(16));
+    EXPECT_EQ(1, std::inner_product(expected.begin(), expected.end(), actual.begin(), 0, std::plus<>(),
+                                    std::not_equal_to<>()));
 
     // Cancelled on the second report: the SDR being read never runs.
     progress = Progress{};
