@@ -19,7 +19,7 @@
  * max(run_count, ceil(min_time x TCK frequency)) clocks in the run state and
  * then waits on the cable for whatever of min_time has not yet passed.
  * STATE RESET always clocks TMS high at least five times.  TRST goes through
- * the plug-in option "trst" (values "on", "off", "z"); a cable without it
+ * the plug-in option "trst" ("1" for ON, "0" for OFF and Z); a cable without it
  * gets one warning, and TRST ON then resets the TAP with TMS.  PIO and PIOMAP
  * are refused.  FREQUENCY lowers the cable's "frequency" option when the
  * cable runs faster; a FREQUENCY above the cable's speed is a warning.  The

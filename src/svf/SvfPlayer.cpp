@@ -323,7 +323,9 @@ void SvfPlayer::trst(const SvfStatement& s)
         return;
     }
     if (m_target && m_trstLine != 0) {
-        const char* value = s.trst == Mode::On ? "on" : s.trst == Mode::Off ? "off" : "z";
+        // The cable SDK's reset-line option: 1 asserts TRST*, 0 releases it
+        // (a released line is as good as a floating one here).
+        const char* value = s.trst == Mode::On ? "1" : "0";
         if (!JEX_FAILED(m_target->setOption("trst", value))) {
             m_trstLine = 1;
         } else {

@@ -13,6 +13,7 @@ namespace jexjtag::cli {
     X(shift)                \
     X(info)                 \
     X(svf)                  \
+    X(serve)                \
     X(help)
 
 #define JEXJTAG_DECLARE_COMMAND(name) extern const Command name##Command;
