@@ -46,11 +46,17 @@ printf '! nothing\n' > "$work/empty.svf"
 default_chain=0x4BA00477:4:idcode=0xE:user=0xA:userbits=35,0x0362D093:6:idcode=0x9,0x41111043:8:idcode=0xE0:user=0x32
 default_taps='jtag newtap dp tap -irlen 4 -expected-id 0x4ba00477; jtag newtap xc7 tap -irlen 6 -expected-id 0x0362d093; jtag newtap ecp5 tap -irlen 8 -expected-id 0x41111043'
 
-# start_server KIND LOG: bitbang_chain.py; sets $port.
-start_server() {
+# use_server KIND: a bitbang_chain.py for that chain, started once and kept
+# for every player and file (one client at a time; each connection
+# rewrites $work/events); sets $port.
+server_kind=
+use_server() {
+    [ "$server_kind" = "$1" ] && return 0
+    [ -n "$server_pid" ] && kill "$server_pid" 2>/dev/null && wait "$server_pid" 2>/dev/null
     : > "$work/server.out"
-    timeout 600 python3 "$here/bitbang_chain.py" --chain "$1" --log "$2" > "$work/server.out" 2>&1 &
+    timeout 900 python3 "$here/bitbang_chain.py" --chain "$1" --log "$work/events" > "$work/server.out" 2>&1 &
     server_pid=$!
+    server_kind=$1
     port=
     i=0
     while [ $i -lt 100 ]; do
@@ -62,25 +68,17 @@ start_server() {
     echo "bitbang_chain.py did not start: $(cat "$work/server.out")"
     return 1
 }
-stop_server() {
-    kill "$server_pid" 2>/dev/null
-    wait "$server_pid" 2>/dev/null
-    server_pid=
-}
 
 # ours ARGS...: "pass", "mismatch LINE" or "error".
 ours() {
     timeout 300 "$jexjtag" svf "$@" --json > "$work/ours.json" 2> "$work/ours.err"
-    python3 - "$work/ours.json" "$?" <<'PY'
-import json, sys
-try:
-    r = json.load(open(sys.argv[1]))
-except Exception:
-    print("error"); sys.exit()
-if sys.argv[2] == "0" and r["outcome"] == "passed": print("pass")
-elif r["outcome"] == "mismatch": print("mismatch", r["first_mismatch"]["line"])
-else: print("error")
-PY
+    rc=$?
+    outcome=$(sed -n 's/^  "outcome": "\([a-z_]*\)",$/\1/p' "$work/ours.json")
+    if [ $rc -eq 0 ] && [ "$outcome" = passed ]; then echo pass
+    elif [ "$outcome" = mismatch ]; then
+        echo "mismatch $(sed -n '/"first_mismatch"/,/}/s/^ *"line": \([0-9]*\),$/\1/p' "$work/ours.json")"
+    else echo error
+    fi
 }
 
 # openocd_svf FILE TAPS: "pass", "mismatch LINE" or "error".
@@ -96,29 +94,24 @@ openocd_svf() {
     fi
 }
 
-# play_served PLAYER FILE KIND TAPS: plays FILE through a server; prints
-# the outcome, leaves what the devices saw in $work/events.
+# play_served PLAYER FILE KIND TAPS: plays FILE through the server (which
+# use_server started); prints the outcome, leaves what the devices saw in
+# $work/events.
 play_served() {
     rm -f "$work/events"
-    start_server "$3" "$work/events" || { echo error; return; }
     if [ "$1" = oocd ]; then out=$(openocd_svf "$2" "$4")
     else out=$(ours "$2" --target remote_bitbang --arg host=127.0.0.1 --arg "port=$port")
     fi
     i=0
-    while [ ! -s "$work/events" ] && [ $i -lt 50 ]; do sleep 0.1; i=$((i + 1)); done
-    stop_server
+    while [ ! -f "$work/events" ] && [ $i -lt 100 ]; do sleep 0.05; i=$((i + 1)); done
     echo "$out"
 }
 
 # seen PLAYER FILE KIND TAPS: as play_served; what the devices saw for FILE
 # alone (without what an empty file gives, counted once per player and
-# chain) goes to $work/seen.PLAYER.
+# chain in agree) goes to $work/seen.PLAYER.
 seen() {
     skipfile="$work/skip.$1.$3"
-    if [ $have_rbb = yes ] && [ ! -f "$skipfile" ]; then
-        play_served "$1" "$work/empty.svf" "$3" "$4" > /dev/null
-        wc -l < "$work/events" > "$skipfile"
-    fi
     out=$(play_served "$@")
     skip=0
     [ -f "$skipfile" ] && skip=$(cat "$skipfile")
@@ -131,6 +124,14 @@ failures=0
 agree() {
     name=$(basename "$1")
     want=$5
+    use_server "$3" || { failures=$((failures + 1)); return; }
+    if [ $have_rbb = yes ]; then
+        for player in oocd ours; do
+            [ -f "$work/skip.$player.$3" ] && continue
+            play_served $player "$work/empty.svf" "$3" "$4" > /dev/null
+            wc -l < "$work/events" > "$work/skip.$player.$3"
+        done
+    fi
     c=$(seen oocd "$1" "$3" "$4")
     problems=
     [ "$c" = "${6:-$want}" ] || problems="$problems OpenOCD '$c';"
