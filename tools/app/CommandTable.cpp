@@ -13,6 +13,7 @@ namespace jexjtag::cli {
     X(bsdl)                 \
     X(shift)                \
     X(info)                 \
+    X(svf)                  \
     X(serve)                \
     X(help)
 
