@@ -4,6 +4,7 @@
 // the session-level operations every other layer uses.  Only the registry
 // constructs and destroys sessions.
 
+#include <atomic>
 #include <istream>
 #include <memory>
 #include <string>
@@ -45,13 +46,16 @@ public:
     // The target slot (only index 0 exists).  getTarget: the target or
     // null.  createTarget: destroys the old target first, then stores and
     // returns a new one (null for another index or when it cannot be
-    // made).  destroyTarget: deletes the target, which closes it.
+    // made).  destroyTarget: takes the target out of the slot and deletes
+    // it, which closes it; inside a call from a callback the deletion waits
+    // until the outermost call returns (the target may be in use).
     virtual Target* getTarget(unsigned index) const;
     virtual Target* createTarget(unsigned index);
     virtual void destroyTarget(unsigned index);
 
     // Delivers a message to the host: its callback, or else standard output
     // with the type's prefix ("Error:", "Warning:", "Status:", "Info:").
+    // Nothing once the host has destroyed the session.
     virtual void sendMessage(unsigned msgType, const std::string& text);
 
     // Stores the host's search path, then refreshes the target list.
@@ -85,6 +89,12 @@ public:
 
     const std::vector<std::string>& getArguments() const { return m_args; }
 
+    // Set by the registry when the host destroys the session: its handle
+    // reaches nothing any more and its messages are dropped, while a call
+    // still under way finishes with it.
+    void markClosing() { m_closing = true; }
+    bool isClosing() const { return m_closing; }
+
     // The one plug-in manager of the process: created by the first
     // session's init, deleted by the registry after the last session
     // (unless "unloadtargetsondestroy=false").  Null while none exists.
@@ -98,6 +108,7 @@ private:
     std::string m_pluginSearchPath;
     std::unique_ptr<InternalSessionMessageListener> m_messageListener;
     DeviceDB m_deviceDB;
+    std::atomic<bool> m_closing {false};
 };
 
 } // namespace JexRT

@@ -30,14 +30,17 @@ Op pluginOp(const JexPluginInstance* instance, Op JexPluginOps::*member, const c
     return op;
 }
 
-JexPluginInstance* createInstance(const std::string& type)
+// An instance goes back to the module that created it: a later discovery
+// may have made another module serve the same type.
+JexPluginInstance* createInstance(const std::string& type, const PluginModule*& creator)
 {
-    return Session::m_pluginManager ? Session::m_pluginManager->createPluginInstance(type) : nullptr;
+    creator = nullptr;
+    return Session::m_pluginManager ? Session::m_pluginManager->createPluginInstance(type, &creator) : nullptr;
 }
 
-void destroyInstance(const std::string& type, JexPluginInstance* instance)
+void destroyInstance(const PluginModule* creator, JexPluginInstance* instance)
 {
-    if (Session::m_pluginManager) Session::m_pluginManager->destroyPluginInstance(type, instance);
+    if (Session::m_pluginManager) Session::m_pluginManager->destroyPluginInstance(creator, instance);
 }
 
 struct ShiftNames {
@@ -112,7 +115,8 @@ unsigned Vivedoru10TargetImpl::open(const std::string& name, JexJtagCallContext*
         return tracer.setReturnStatus(result);
     }
 
-    JexPluginInstance* instance = createInstance(name);
+    const PluginModule* creator = nullptr;
+    JexPluginInstance* instance = createInstance(name, creator);
     if (!instance) {
         reportError("Could not open plugin of the type: " + name +
                     ". Please check to make sure the correct plug-in for this type is installed.\n");
@@ -127,8 +131,12 @@ unsigned Vivedoru10TargetImpl::open(const std::string& name, JexJtagCallContext*
             result = openTarget(instance, argc, argv.data(), &copy);
         if (Logger::logger.isEnabled(3))
             Logger::logger.printLog(3, "openTarget %s, returned %s\n", name.c_str(), statusText(result));
-        if (JEX_FAILED(result)) destroyInstance(name, instance);
-        else m_plugin = instance;
+        if (JEX_FAILED(result)) {
+            destroyInstance(creator, instance);
+        } else {
+            m_plugin = instance;
+            m_creator = creator;
+        }
     }
 
     if (Logger::logger.isEnabled(3))
@@ -150,7 +158,8 @@ unsigned Vivedoru10TargetImpl::close()
 
     JexPluginInstance* instance = m_plugin;
     m_plugin = nullptr;
-    destroyInstance(m_targetName, instance);
+    destroyInstance(m_creator, instance);
+    m_creator = nullptr;
     return tracer.setReturnStatus(result);
 }
 
@@ -200,7 +209,8 @@ unsigned Vivedoru10TargetImpl::cleanLocks(const std::string& type)
         return tracer.setReturnStatus(result);
     }
 
-    JexPluginInstance* instance = createInstance(type);
+    const PluginModule* creator = nullptr;
+    JexPluginInstance* instance = createInstance(type, creator);
     if (Logger::logger.isEnabled(3))
         Logger::logger.printLog(3, "Session::m_pluginManager->createPluginInstance(type=%s), returned %s\n",
                                 type.c_str(), PointerText(instance).c_str());
@@ -209,7 +219,7 @@ unsigned Vivedoru10TargetImpl::cleanLocks(const std::string& type)
             setHandle(instance, m_session ? m_session->getHandle() : 0);
         if (auto clean = pluginOp(instance, &JexPluginOps::cleanLocks, "cleanLocks")) result = clean(instance);
         Logger::logger.printLog(3, "cleanLocks() returning %s\n", statusText(result));
-        destroyInstance(type, instance);
+        destroyInstance(creator, instance);
     }
     return tracer.setReturnStatus(result);
 }

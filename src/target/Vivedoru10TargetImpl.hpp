@@ -19,6 +19,7 @@
 namespace JexRT {
 
 class Session;
+struct PluginModule;
 
 class Vivedoru10TargetImpl : public ITarget {
 public:
@@ -101,6 +102,7 @@ private:
 
     Session* m_session;
     JexPluginInstance* m_plugin = nullptr;
+    const PluginModule* m_creator = nullptr; // the module m_plugin came from
     std::string m_targetName;        // the type m_plugin was created under
     std::vector<std::string> m_args; // of the last accepted open
     bool m_locked = false;

@@ -5,16 +5,24 @@
 #include <cstdlib>
 #include <cstring>
 #include <cwchar>
+#include <mutex>
 
 #include "platform/FileSystem.hpp"
 #include "platform/Process.hpp"
 
 namespace {
 
-std::string& userDataDir()
+// The data directory a session set, shared by every thread; never
+// destroyed, like the library's other process-wide state.
+struct UserDataDir {
+    std::mutex mutex;
+    std::string dir;
+};
+
+UserDataDir& userDataDir()
 {
-    static std::string dir;
-    return dir;
+    static UserDataDir* const dir = new UserDataDir();
+    return *dir;
 }
 
 std::string withTrailingSeparator(std::string dir)
@@ -96,13 +104,20 @@ int Jex_Util::isDirectory(const std::string& path) { return jexplatform::isDirec
 
 std::string Jex_Util::getDataDirPath()
 {
-    if (!userDataDir().empty()) return withTrailingSeparator(userDataDir());
+    {
+        std::lock_guard<std::mutex> lock(userDataDir().mutex);
+        if (!userDataDir().dir.empty()) return withTrailingSeparator(userDataDir().dir);
+    }
     const std::string env = jexplatform::environment("JEXJTAG_DATA_DIR");
     if (!env.empty()) return withTrailingSeparator(env);
     return withTrailingSeparator(findLibInPath("libJexJtag") + "/../share/jexjtag");
 }
 
-void Jex_Util::setUserDataDirPath(const std::string& dir) { userDataDir() = dir; }
+void Jex_Util::setUserDataDirPath(const std::string& dir)
+{
+    std::lock_guard<std::mutex> lock(userDataDir().mutex);
+    userDataDir().dir = dir;
+}
 
 std::string Jex_Util::dotLumenfoldDirectory()
 {

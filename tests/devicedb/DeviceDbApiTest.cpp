@@ -35,7 +35,10 @@ protected:
     void SetUp() override
     {
         writeFile(env.dataDir() / "idcode.lst", kInstalledList);
-        ASSERT_EQ(JEX_SUCCESS, JexJtag_session_create(nullptr, 0, nullptr, &handle));
+        // "datadir" is process-wide: name it, whatever an earlier test left.
+        const std::string dataDir = "datadir=" + env.dataDir().string();
+        const char* argv[] = {dataDir.c_str()};
+        ASSERT_EQ(JEX_SUCCESS, JexJtag_session_create(nullptr, 1, argv, &handle));
     }
     void TearDown() override { JexJtag_session_destroy(handle); }
     unsigned add(const std::string& text, const char* name = "host.lst")
@@ -228,14 +231,11 @@ TEST(DeviceDbSessionCreation, MissingListFailsAndEmptyListGivesAnEmptyDatabase)
     std::filesystem::remove(env.dataDir() / "idcode.lst");
     LogCapture log(1);
     unsigned handle = 99;
-    EXPECT_EQ(JEX_FAILURE, JexJtag_session_create(nullptr, 0, nullptr, &handle));
-    EXPECT_EQ(0u, handle);
-    EXPECT_TRUE(log.has("\nError: Unable to open " + env.dataDir().string() + "/idcode.lst\n")) << log.text();
-
-    // The same through "datadir", given with a trailing separator.
+    // "datadir" (process-wide), given with a trailing separator.
     const std::string arg = "datadir=" + env.home().string() + "/";
     const char* argv[] = {arg.c_str()};
     EXPECT_EQ(JEX_FAILURE, JexJtag_session_create(nullptr, 1, argv, &handle));
+    EXPECT_EQ(0u, handle);
     EXPECT_TRUE(log.has("\nError: Unable to open " + env.home().string() + "/idcode.lst\n")) << log.text();
 
     writeFile(env.dataDir() / "idcode.lst", "");
@@ -256,7 +256,9 @@ TEST(DeviceDbShippedList, HoldsRealDevices)
 {
     IsolatedEnvironment env;
     unsigned handle = 0;
-    ASSERT_EQ(JEX_SUCCESS, JexJtag_session_create(nullptr, 0, nullptr, &handle));
+    const std::string dataDir = "datadir=" + env.dataDir().string();
+    const char* argv[] = {dataDir.c_str()};
+    ASSERT_EQ(JEX_SUCCESS, JexJtag_session_create(nullptr, 1, argv, &handle));
     char name[64];
     char bypass[64];
     unsigned irlen = 0;
