@@ -1,8 +1,9 @@
 /*
  * db.h - the session's device database and BSDL import.
  *
- * IDCODE texts are '0'/'1' characters, most significant bit first; a
- * shorter text counts as having leading zeros.
+ * IDCODE texts are 1 to 32 characters '0', '1', 'X' or 'x' (X: a bit that
+ * matches either value), most significant bit first; a shorter text counts
+ * as having leading zeros.  Any other text fails.
  */
 #ifndef JEXJTAG_DB_H
 #define JEXJTAG_DB_H

@@ -19,6 +19,9 @@ namespace {
 
 constexpr unsigned kReadBit = JEXJTAG_SHIFT_READ;
 constexpr unsigned kWriteBit = JEXJTAG_SHIFT_WRITE;
+// Every device has an instruction register of at least 2 bits, and no
+// chain is read with an IR scan longer than 4096 bits.
+constexpr unsigned kMaxChainDevices = 2048;
 
 // The plug-in's operation, or null (logged) when its table lacks it: a
 // missing operation fails like a refusing plug-in instead of crashing.
@@ -351,8 +354,16 @@ unsigned Vivedoru10TargetImpl::getDeviceCount(unsigned* count)
     if (!hasPlugin()) return tracer.setReturnStatus(JEX_FAILURE);
     auto op = pluginOp(m_plugin, &JexPluginOps::getDeviceCount, "getDeviceCount");
     if (!op) return tracer.setReturnStatus(JEX_FAILURE);
-    *count = op(m_plugin);
-    Logger::logger.printLog(3, "getDeviceCount() returning %d\n", static_cast<int>(*count));
+    const unsigned answer = op(m_plugin);
+    Logger::logger.printLog(3, "getDeviceCount() returning %d\n", static_cast<int>(answer));
+    // The operation has no failure channel: an error value shows up as a
+    // count that no chain can have.
+    if (answer > kMaxChainDevices) {
+        reportError("The plug-in reports " + std::to_string(answer) + " devices on the chain; a chain has at most " +
+                    std::to_string(kMaxChainDevices) + ".\n");
+        return tracer.setReturnStatus(JEX_FAILURE);
+    }
+    *count = answer;
     return tracer.setReturnStatus(JEX_SUCCESS);
 }
 
@@ -456,7 +467,8 @@ unsigned Vivedoru10TargetImpl::navigate(unsigned newState, unsigned clockRepeat,
 
     if (microSeconds != 0) {
         if (auto flushOp = pluginOp(m_plugin, &JexPluginOps::flush, "flush")) flushOp(m_plugin);
-        jexplatform::sleepMilliseconds(microSeconds / 1000);
+        // Callers wait for device timing: never less than asked.
+        jexplatform::sleepMicroseconds(microSeconds);
         Logger::logger.printLog(3, "Slept for %u microSeconds...\n", microSeconds);
     }
     return tracer.setReturnStatus(result);

@@ -60,7 +60,7 @@ static_assert(!std::is_copy_constructible_v<Jex_DeviceData> && !std::is_copy_ass
 TEST(DeviceDataLines, AFullLineGivesOneEntry)
 {
     Jex_DeviceData table;
-    read(table, kDevA + " 6 1 2 DEVA\n" + "1" + P.substr(1) + " 2147483647 007 0 BIG\n");
+    read(table, kDevA + " 6 1 2 DEVA\n" + "1" + P.substr(1) + " 4096 2147483647 0 BIG\n");
     const Jex_OneDeviceData* e = table.findByIdcode(0x0A001093);
     ASSERT_NE(nullptr, e);
     EXPECT_EQ(P, e->getMatchText());
@@ -72,11 +72,11 @@ TEST(DeviceDataLines, AFullLineGivesOneEntry)
     EXPECT_EQ(0xFFFFFFFFu, e->getNonXMask());
     EXPECT_EQ(0x093u, e->getMfg());
     EXPECT_FALSE(e->isMatch(0x1A001093));
-    // The largest numbers, with leading zeros.
-    EXPECT_EQ(2147483647, table.getIRLength(static_cast<int>(0x8A001093u)));
+    // The largest numbers: IR length 4096 (longer is bad data), family 2^31 - 1.
+    EXPECT_EQ(4096, table.getIRLength(static_cast<int>(0x8A001093u)));
     int family = -1;
     table.getFamilyTypeByIdcode(static_cast<int>(0x8A001093u), &family, nullptr);
-    EXPECT_EQ(7, family);
+    EXPECT_EQ(2147483647, family);
 }
 
 TEST(DeviceDataLines, DontCareBitsAndCommas)
@@ -202,12 +202,7 @@ TEST(DeviceDataErrors, EntriesBeforeABadLineStayAndNothingOlderIsLost)
     const std::string text = "1111" + P.substr(4) + " 4 0 0 NEWB\n" + P + " 6 0 0 NEWA\n" + P + " 6 1 2 X\n";
     EXPECT_EQ(lineError(2, "bad data."), thrown([&] { read(table, text); }));
     ASSERT_EQ(3u, table.getEntryCount());
-    // Appended behind the older entries, in reading order (not sorted yet).
-    EXPECT_EQ("OLD", table.getEntry(0).getName());
-    EXPECT_EQ("NEWB", table.getEntry(1).getName());
-    EXPECT_EQ("NEWA", table.getEntry(2).getName());
-    // The next complete read sorts them in.
-    read(table, "");
+    // Sorted in at once, so they take part in lookups.
     EXPECT_EQ("NEWA", table.getEntry(0).getName());
     EXPECT_EQ("OLD", table.getEntry(1).getName());
     EXPECT_EQ("NEWB", table.getEntry(2).getName());

@@ -144,6 +144,25 @@ TEST_F(DeviceDbApiTest, BadLineFailsAndKeepsTheLinesBeforeIt)
     EXPECT_EQ(JEX_FAILURE, JexJtag_db_addDeviceData(0x00770000u, "x.lst", "", 0));
 }
 
+TEST_F(DeviceDbApiTest, ListOrderLimitsAndIdcodeTexts)
+{
+    // Entries kept before a bad line are sorted in: the exact pattern wins
+    // over the installation's don't-care one.
+    EXPECT_EQ(JEX_FAILURE, add("00000001010000010100000010010011 8 0 0 EXACT\nbad\n"));
+    EXPECT_EQ("EXACT", lookup(kXc3s200).name);
+    // 'x' sorts as 'X': the host's entry wins over the installation's.
+    EXPECT_EQ(JEX_SUCCESS, add("xxxx0010000010100001000011011101 10 0 0 LOWER\n"));
+    EXPECT_EQ("LOWER", lookup(kEpm240).name);
+    // An IR length above 4096 is bad data.
+    LogCapture log(2);
+    EXPECT_EQ(JEX_FAILURE, add("00000000000000000000000000000111 2000000000 0 0 HUGE\n", "huge.lst"));
+    EXPECT_TRUE(log.has("*** EXCEPTION: Input error in file: huge.lst line:0 - bad data.\n"));
+    EXPECT_EQ(JEX_SUCCESS, add("00000000000000000000000000000111 4096 0 0 BIG\n"));
+    // Only 1 to 32 characters of 0, 1, X and x are IDCODE texts.
+    for (const char* text : {"0x0362D093", "", "000000000000000000000000000000011"})
+        EXPECT_EQ(JEX_FAILURE, lookup(text).status) << text;
+}
+
 TEST_F(DeviceDbApiTest, TextsAreCutToTheirBuffers)
 {
     EXPECT_EQ(JEX_SUCCESS, add("00000000000000000000000000000111 40 0 0 WIDE_IR_DEVICE\n"));

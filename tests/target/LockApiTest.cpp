@@ -3,6 +3,8 @@
 
 #include <gtest/gtest.h>
 
+#include <type_traits>
+
 #include <string>
 #include <vector>
 
@@ -13,6 +15,10 @@ using namespace targettest;
 using testsupport::LogCapture;
 
 namespace {
+
+// Only the object that took a lock releases it: no copies.
+static_assert(!std::is_copy_constructible_v<JexRT::JexJtagTargetLock> &&
+              !std::is_copy_assignable_v<JexRT::JexJtagTargetLock>);
 
 using LockApiTest = RecordingFixture;
 
