@@ -37,9 +37,15 @@ public:
     // length, the IDCODE register text ("" when the device has none) and
     // the first BYPASS opcode, each text cut to 2047 characters.  On
     // failure the host gets an error message and outputs written before the
-    // failure keep their values.  JEX_SUCCESS or JEX_FAILURE.
+    // failure keep their values.  Messages name the file `shownName` (the
+    // path when empty).  JEX_SUCCESS or JEX_FAILURE.
     virtual unsigned parseBSDLFromFile(const std::string& path, std::string& deviceName, unsigned* irlength,
-                                       std::string& idcode, std::string& bypass);
+                                       std::string& idcode, std::string& bypass, const std::string& shownName = "");
+    // Reads the BSDL file at `path` whole, once and without seeking (pipes
+    // and FIFOs work), at most the BSDL reader's size limit.  On failure the
+    // host gets an error message naming the file.  JEX_SUCCESS or
+    // JEX_FAILURE.
+    virtual unsigned readBSDLFile(const std::string& path, std::string& content);
     virtual const char* getClassName() const { return "Session"; }
     virtual unsigned getHandle() const { return m_handle; }
 
@@ -82,7 +88,9 @@ public:
                                   bool* isUserList);
     // The same for a BSDL text in memory: it is written to a temporary file
     // named after the base name of `filename` in the per-user ".lumenfold"
-    // directory, read from there, and the file is removed again.
+    // directory, read from there, and the file is removed again.  Messages
+    // name `filename`.  A text larger than the reader's limit fails before
+    // anything is copied.
     virtual unsigned parseBSDLFromBuffer(const std::string& filename, const char* buf, unsigned bufLen,
                                          std::string& deviceName, unsigned* irlength, std::string& idcode,
                                          std::string& bypass);

@@ -1,8 +1,5 @@
 #include "BsdlCommand.hpp"
 
-#include <cerrno>
-#include <cstdio>
-#include <cstring>
 #include <vector>
 
 #include "BsdlOutput.hpp"
@@ -16,21 +13,14 @@ namespace {
 
 constexpr unsigned kTextSize = 2048;
 
-// Fails with the system's reason when the file cannot be read at all.
-void checkReadable(const std::string& path)
-{
-    std::FILE* file = std::fopen(path.c_str(), "rb");
-    if (!file) throw CliError("cannot read BSDL file '" + path + "': " + std::strerror(errno));
-    std::fclose(file);
-}
-
 } // namespace
 
 void runBsdl(const Options& options, MessageSink& sink, std::ostream& out)
 {
     BsdlResult result;
     result.file = options.operands.at(0);
-    checkReadable(result.file);
+    // The library opens the file once (a FIFO or pipe has one reader) and
+    // reports why it cannot read it.
     {
         LibrarySession session(options, sink);
         std::vector<char> entity(kTextSize, '\0');
