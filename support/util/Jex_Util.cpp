@@ -126,6 +126,24 @@ std::string Jex_Util::dotLumenfoldDirectory()
     return home + jexplatform::kPathSeparator + ".lumenfold";
 }
 
+std::string Jex_Util::privateTemporaryDirectory()
+{
+    // The home directory's .lumenfold, made private; when the home directory
+    // is unusable (system users have none), a per-user one elsewhere.
+    std::string homeReason = "no home directory";
+    std::string dir;
+    try {
+        dir = dotLumenfoldDirectory();
+        if (jexplatform::ensurePrivateDirectory(dir, homeReason)) return dir;
+    } catch (const Jex_Exception&) {
+    }
+    const std::string fallback = jexplatform::perUserTemporaryDirectory("jexjtag-lumenfold");
+    std::string reason;
+    if (jexplatform::ensurePrivateDirectory(fallback, reason)) return fallback;
+    throw Jex_Exception("Could not use the directory " + (dir.empty() ? std::string("~/.lumenfold") : dir) + ": " +
+                        homeReason + ", nor " + fallback + ": " + reason + "\n");
+}
+
 std::string Jex_Util::createDotLumenfoldTempFile(const std::string& name)
 {
     // Neutralise everything that could leave the directory: separators of
@@ -135,10 +153,8 @@ std::string Jex_Util::createDotLumenfoldTempFile(const std::string& name)
     if (base.find_first_not_of('.') == std::string::npos) base = "tmp" + base;
     if (base.size() > 200) base.resize(200);
 
-    const std::string dir = dotLumenfoldDirectory();
+    const std::string dir = privateTemporaryDirectory();
     std::string reason;
-    if (!jexplatform::ensurePrivateDirectory(dir, reason))
-        throw Jex_Exception("Could not use the directory " + dir + ": " + reason + "\n");
     const std::string path = jexplatform::createUniqueFile(dir, base, reason);
     if (path.empty())
         throw Jex_Exception("Could not create temporary file: " + dir + jexplatform::kPathSeparator + base + ": " +

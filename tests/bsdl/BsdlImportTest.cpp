@@ -232,15 +232,41 @@ TEST_F(BsdlImportTest, TemporaryCopyIsAlwaysRemovedAndMessagesNameTheCallersFile
     }
     EXPECT_FALSE(fs::exists(env.root() / "escape.bsd"));
 
-    // When no temporary file can be made, the host is told and nothing is read.
+}
+
+// ~/.lumenfold is made private; when it cannot be used a per-user directory
+// under $XDG_RUNTIME_DIR or $TMPDIR is; when neither can, the host is told.
+TEST_F(BsdlImportTest, TemporaryDirectoryIsPrivateWithAFallback)
+{
+    const std::string text = testsupport::readFile(kData + "/st_CortexMx.bsd");
+    const fs::path dir = env.home() / ".lumenfold";
+    Outputs o;
+    fs::create_directories(dir);
+    fs::permissions(dir, fs::perms::all);
+    ASSERT_EQ(JEX_SUCCESS, parseText(handle, "dev.bsd", text, o));
+    EXPECT_EQ(fs::perms::owner_all, fs::status(dir).permissions() & fs::perms::all);
+
+    testsupport::ScopedEnv runtime("XDG_RUNTIME_DIR", "");
+    testsupport::ScopedEnv tmp("TMPDIR", env.root().path().string());
+    const fs::path fallback = env.root() / ("jexjtag-lumenfold-" + std::to_string(geteuid()));
+    {
+        testsupport::ScopedEnv noHome("HOME", "/nonexistent"); // as system users have
+        ASSERT_EQ(JEX_SUCCESS, parseText(handle, "dev.bsd", text, o));
+        EXPECT_STREQ("CortexMx", o.name);
+        EXPECT_EQ(fs::perms::owner_all, fs::status(fallback).permissions() & fs::perms::all);
+        EXPECT_TRUE(fs::is_empty(fallback));
+    }
     fs::remove_all(dir);
     testsupport::writeFile(dir, "in the way");
+    fs::remove_all(fallback);
+    testsupport::writeFile(fallback, "in the way too");
     g_received.clear();
-    EXPECT_EQ(JEX_FAILURE, parseText(handle, "dev.bsd", testsupport::readFile(kData + "/st_CortexMx.bsd"), o));
+    EXPECT_EQ(JEX_FAILURE, parseText(handle, "dev.bsd", text, o));
     ASSERT_EQ(1u, messagesOf(JEX_MSG_ERROR).size());
-    EXPECT_NE(std::string::npos, messagesOf(JEX_MSG_ERROR)[0].find(dir)) << messagesOf(JEX_MSG_ERROR)[0];
+    EXPECT_EQ("Could not use the directory " + dir.string() + ": not a directory, nor " + fallback.string() +
+                  ": not a directory\n",
+              messagesOf(JEX_MSG_ERROR)[0]);
     EXPECT_EQ(std::string(sizeof o.name, '\0'), std::string(o.name, sizeof o.name));
-    EXPECT_EQ("in the way", testsupport::readFile(dir));
 }
 
 // Read once without seeking (a pipe works), and never past 64 MiB: a larger
