@@ -1,5 +1,7 @@
 #include "SimCable.hpp"
 
+#include <cerrno>
+#include <cstring>
 #include <stdexcept>
 #include <utility>
 
@@ -77,6 +79,15 @@ void SimCable::stopRecording()
     m_vcd.reset();
 }
 
+uint32_t SimCable::checkRecording(uint32_t status, bool flush)
+{
+    if (!m_vcd || (flush ? m_vcd->flush() : m_vcd->ok())) return status;
+    const std::string reason = errno ? std::strerror(errno) : "write error";
+    const std::string path = m_vcd->path();
+    stopRecording();
+    return fail("writing the waveform to " + path + " failed (" + reason + "); recording stopped");
+}
+
 bool SimCable::interrogateChain(std::string& error)
 {
     ChainScanner::Result result;
@@ -126,6 +137,13 @@ uint32_t SimCable::openTarget(uint32_t argc, const char** argv, JexJtagCallConte
     m_engine->resetTap();
     syncPins(before);
     if (!interrogateChain(error)) warn("the chain cannot be interrogated: " + error);
+    const uint32_t recorded = checkRecording(JEX_SUCCESS, true);
+    if (JEX_FAILED(recorded)) {
+        m_lock.reset();
+        m_engine.reset();
+        m_chain.reset();
+        return recorded;
+    }
     m_open = true;
     return JEX_SUCCESS;
 }
@@ -134,11 +152,14 @@ uint32_t SimCable::closeTarget()
 {
     if (!m_open) return fail("the cable is not open");
     m_lock.reset();
+    const bool recorded = !m_vcd || m_vcd->finish();
+    const std::string vcdPath = m_vcd ? m_vcd->path() : std::string();
     stopRecording();
     m_engine.reset();
     m_chain.reset();
     m_layout.assign({});
     m_open = false;
+    if (!recorded) return fail("writing the waveform to " + vcdPath + " failed; the file is incomplete");
     return JEX_SUCCESS;
 }
 
@@ -280,7 +301,7 @@ uint32_t SimCable::navigateTAP(uint32_t newState, uint32_t clockRepeat)
     m_engine->moveTo(state);
     m_engine->holdClocks(clockRepeat);
     syncPins(before);
-    return JEX_SUCCESS;
+    return checkRecording(JEX_SUCCESS);
 }
 
 uint32_t SimCable::shift(Target target, const ShiftSource& in, ShiftSink& out, uint32_t bitCount, uint32_t exitState,
@@ -308,7 +329,7 @@ uint32_t SimCable::shift(Target target, const ShiftSource& in, ShiftSink& out, u
     if (bitCount == 0) m_engine->moveTo(static_cast<JexJtagTapState>(exitState));
     else m_engine->shift(target.reg, in, out, bitCount, static_cast<JexJtagTapState>(exitState), before, after);
     syncPins(cycles);
-    return JEX_SUCCESS;
+    return checkRecording(JEX_SUCCESS);
 }
 
 #define JEXSIM_READ(reg, dev, idx)                                                                    \
@@ -401,8 +422,7 @@ uint32_t SimCable::shiftDeviceDRReadWrite(uint32_t deviceIndex, const uint8_t* t
 uint32_t SimCable::flush()
 {
     if (!requireOpen()) return JEX_FAILURE;
-    if (m_vcd) m_vcd->flush();
-    return JEX_SUCCESS;
+    return checkRecording(JEX_SUCCESS, true);
 }
 
 void SimCable::driveTck(bool level)
@@ -476,12 +496,9 @@ uint32_t SimCable::pulsePin(uint32_t pin, uint32_t count)
 uint32_t SimCable::waitTime(uint32_t microseconds)
 {
     if (!requireOpen()) return JEX_FAILURE;
-    if (m_vcd) {
-        m_vcd->wait(microseconds);
-        m_vcd->flush();
-    }
+    if (m_vcd) m_vcd->wait(microseconds);
     jexcable::PluginPlatform::sleepMicroseconds(microseconds);
-    return JEX_SUCCESS;
+    return checkRecording(JEX_SUCCESS, true);
 }
 
 // ---- commands -------------------------------------------------------------------------------

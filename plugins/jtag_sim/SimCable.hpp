@@ -128,6 +128,9 @@ private:
     bool interrogateChain(std::string& error);
     void buildChain();
     void stopRecording();
+    // status, or a failure with a message when writing the waveform has
+    // failed (recording stops then: the file is incomplete).
+    uint32_t checkRecording(uint32_t status, bool flush = false);
     void syncPins(uint64_t cyclesBefore);
     void driveTck(bool level);
     uint32_t setOption(const std::string& key, const std::string& value);

@@ -75,13 +75,20 @@ VcdRecorder::VcdRecorder(const std::string& path, const SimChain& chain, uint64_
     m_stamped = 0;
 }
 
-VcdRecorder::~VcdRecorder()
+VcdRecorder::~VcdRecorder() { finish(); }
+
+bool VcdRecorder::finish()
 {
-    if (!m_file) return;
+    if (!m_file) return true;
     // A last time stamp, so viewers show the final half cycle.
     std::fprintf(m_file, "#%llu\n", static_cast<unsigned long long>(m_time));
-    std::fclose(m_file);
+    const bool written = ok();
+    const bool closed = std::fclose(m_file) == 0;
+    m_file = nullptr;
+    return written && closed;
 }
+
+bool VcdRecorder::ok() const { return m_file && !std::ferror(m_file); }
 
 void VcdRecorder::stamp()
 {
@@ -140,9 +147,9 @@ void VcdRecorder::setFrequency(uint64_t frequencyHz)
     m_halfPeriod = halfPeriodPs(frequencyHz);
 }
 
-void VcdRecorder::flush()
+bool VcdRecorder::flush()
 {
-    std::fflush(m_file);
+    return m_file && std::fflush(m_file) == 0 && ok();
 }
 
 } // namespace jexsim

@@ -363,3 +363,14 @@ TEST_F(CliProgramTest, BsdlReadsAFifo)
     EXPECT_EQ(0, r.exitCode) << r.err;
     EXPECT_TRUE(contains(r.out, "IR length  2")) << r.out;
 }
+
+// A lock directory that cannot be used is reported as what it is.
+TEST_F(CliProgramTest, AnUnusableLockDirectoryIsNotCalledAHolder)
+{
+    const std::string blocked = (runner.dir() / "not-a-dir").string();
+    testsupport::writeFile(blocked, "");
+    runner.setEnv("JEXJTAG_LOCK_DIR", blocked);
+    const RunResult r = run({"scan", "--lock-wait", "0"});
+    expectFailure(r, "cannot lock target 'jtag_sim': jtag_sim: cannot lock port");
+    EXPECT_EQ(std::string::npos, r.err.find("locked by another process")) << r.err;
+}
