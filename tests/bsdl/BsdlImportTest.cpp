@@ -298,26 +298,3 @@ TEST_F(BsdlImportTest, PipesWorkAndTheSizeLimitComesFirst)
     EXPECT_EQ("BSDL file 'big.bsd': the text is larger than 64 MiB; it is not read\n", messagesOf(JEX_MSG_ERROR)[0]);
     expectNoTemporaryFiles();
 }
-
-TEST_F(BsdlImportTest, TraceLines)
-{
-    LogCapture log(3);
-    const std::string path = kData + "/st_CortexMx.bsd";
-    Outputs o;
-    ASSERT_EQ(JEX_SUCCESS, parseFile(handle, path, o));
-    std::vector<std::string> bsdlLines;
-    for (const std::string& line : log.lines())
-        if (line.rfind("JexJtag_db_", 0) == 0) bsdlLines.push_back(line);
-    const std::string h = std::to_string(handle);
-    const std::vector<std::string> expected = {
-        "JexJtag_db_parseBSDLFile() handle=" + h + ", filename=" + path + ", deviceNameLen=64, idcodeLen=40, "
-        "bypassbufLen=16\n",
-        "JexJtag_db_parseBSDL() handle=" + h + ", filename=" + path + ", bufLen=4235, deviceNameLen=64, idcodeLen=40, "
-        "bypassbufLen=16\n",
-        "JexJtag_db_parseBSDL() returning deviceName=CortexMx, irlength=4, idcode=XXXX1011101000000000010001110111, "
-        "cmd_bypass=1111\n",
-        "JexJtag_db_parseBSDLFile() returning deviceName=CortexMx, irlength=4, "
-        "idcode=XXXX1011101000000000010001110111, cmd_bypass=1111\n",
-    };
-    EXPECT_EQ(expected, bsdlLines);
-}

@@ -178,23 +178,6 @@ TEST(DeviceDataOrder, ConcreteBitBeforeDontCare)
     EXPECT_EQ("ANY", table.getEntry(2).getName());
 }
 
-TEST(DeviceDataOrder, MissesGiveEmptyResults)
-{
-    Jex_DeviceData table;
-    read(table, P + " 6 1 2 DEVA\n");
-    EXPECT_EQ(nullptr, table.findByIdcode(0));
-    EXPECT_EQ("", table.getDeviceName(0));
-    EXPECT_EQ(0, table.getIRLength(0));
-    int family = -1, sub = -1;
-    table.getFamilyTypeByIdcode(0, &family, &sub);
-    EXPECT_EQ(0, family);
-    EXPECT_EQ(0, sub);
-    table.getFamilyTypeByIdcode(0, nullptr, nullptr);
-    table.resetEntries();
-    EXPECT_EQ(0u, table.getEntryCount());
-    EXPECT_EQ(nullptr, table.findByIdcode(0x0A001093));
-}
-
 TEST(DeviceDataErrors, EntriesBeforeABadLineStayAndNothingOlderIsLost)
 {
     Jex_DeviceData table;
@@ -217,18 +200,6 @@ TEST(DeviceDataErrors, EntryConstructorRejectsWrongPatterns)
     EXPECT_EQ(1u, ok.getMfg());
     EXPECT_EQ(P, Jex_OneDeviceData::intIdcodeToString(0x0A001093));
     EXPECT_EQ(std::string(32, '1'), Jex_OneDeviceData::intIdcodeToString(-1));
-}
-
-TEST(DeviceDataText, DiagnosticForm)
-{
-    Jex_DeviceData table;
-    read(table, "XXXX" + P.substr(4) + " 10 0 0 DEVB\n", true);
-    std::ostringstream out;
-    out << table << 26;
-    EXPECT_EQ("Entry 0:\norg. match value:'XXXX" + P.substr(4) + "'\n" +
-                  "name:'DEVB' ir length:10 mfg:093 userentry:1\nidcode  :0a001093\nnonXMask:0fffffff\n\n"
-                  "26", // the stream is left as it was
-              out.str());
 }
 
 TEST(DeviceDataFiles, NamedFileAndItsDataFile)

@@ -224,26 +224,6 @@ TEST_F(DeviceDbApiTest, UnknownCodeClearsTheOutputsAFailureFillsBypassWithFF)
     EXPECT_EQ(5u, ir);
 }
 
-TEST_F(DeviceDbApiTest, TraceLines)
-{
-    LogCapture log(3);
-    unsigned irlen = 0;
-    EXPECT_EQ(JEX_SUCCESS, JexJtag_db_getIRLengthForIdcode(handle, kEpm240, &irlen));
-    add("", "trace.lst");
-    const std::string h = std::to_string(handle);
-    std::vector<std::string> traced;
-    for (const std::string& line : log.lines())
-        if (line.rfind("JexJtag_db_", 0) == 0) traced.push_back(line);
-    const std::vector<std::string> expected = {
-        "JexJtag_db_getIRLengthForIdcode() handle=" + h + ", idcode=" + kEpm240 + "\n",
-        "JexJtag_db_lookupDevice() handle=" + h + ", idcode=" + kEpm240 + ", devicebuf_size=128, bypassbuf_size=33\n",
-        "JexJtag_db_lookupDevice() returning deviceName=EPM240, irlen=10, cmd_bypass=1111111111\n",
-        "JexJtag_db_getIRLengthForIdcode() returning irlen=10\n",
-        "JexJtag_db_addDeviceData() handle=" + h + ", filename=trace.lst, bufsize=0\n",
-    };
-    EXPECT_EQ(expected, traced);
-}
-
 TEST(DeviceDbSessionCreation, MissingListFailsAndEmptyListGivesAnEmptyDatabase)
 {
     IsolatedEnvironment env;

@@ -177,29 +177,6 @@ TEST_F(SessionApiTest, EveryTypeReachesTheCallbackUnchanged)
     EXPECT_EQ(JEX_FAILURE, JexJtag_session_sendMessage(h, JEX_MSG_INFO, nullptr));
 }
 
-TEST_F(SessionApiTest, TraceLines)
-{
-    LogCapture log(3);
-    const char* args[] = {"alpha=1", "beta=two"};
-    unsigned h = 0, count = 0;
-    ASSERT_EQ(JEX_SUCCESS, JexJtag_session_create(nullptr, 2, args, &h));
-    const std::string handle = std::to_string(h);
-    JexJtag_session_sendMessage(h, 7, "dbg");
-    JexJtag_session_sendMessage(0x00420000, JEX_MSG_ERROR, "lost");
-    JexJtag_session_getTargetCount(h, &count);
-    JexJtag_session_destroy(h);
-    for (const std::string& line :
-         {std::string("JexJtag_session_create() argc=2\n"), std::string("JexJtag_session_create() argv[0]:alpha=1\n"),
-          std::string("JexJtag_session_create() argv[1]:beta=two\n"),
-          "JexJtag_session_create() returning handle=" + handle + "\n",
-          "JexJtag_session_sendMessage() handle=" + handle + ", msgType=JEX_MSG_DEBUG(7): dbg\n",
-          std::string("JexJtag_session_sendMessage() handle=4325376, msgType=JEX_MSG_ERROR: lost\n"),
-          "JexJtag_session_getTargetCount() handle=" + handle + "\n",
-          std::string("JexJtag_session_getTargetCount() returning count=0\n"),
-          "JexJtag_session_destroy() handle=" + handle + "\n"})
-        EXPECT_TRUE(log.has(line)) << line;
-}
-
 TEST_F(SessionApiTest, LoggingOffWritesNothing)
 {
     testsupport::TempDir dir;
