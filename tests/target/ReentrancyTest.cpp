@@ -39,7 +39,9 @@ protected:
         configure(config);
         ASSERT_EQ(JEX_SUCCESS, JexJtag_session_create(callBackIn, 0, nullptr, &g_handle));
         m_handle = g_handle;
-        if (expectOpen) ASSERT_EQ(JEX_SUCCESS, open());
+        if (expectOpen) {
+            ASSERT_EQ(JEX_SUCCESS, open());
+        }
     }
     // The session is gone: a later TearDown must not destroy a reused id.
     void expectSessionGone()
