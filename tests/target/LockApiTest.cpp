@@ -40,11 +40,7 @@ TEST_F(LockApiTest, LockTwiceThenUnlock)
 
     EXPECT_EQ((std::vector<std::string>{"lockTarget msWait=500", "unlockTarget"}), calls());
     const std::string hs = std::to_string(h);
-    EXPECT_TRUE(log.has("JexJtag_target_lock() handle=" + hs + ", msWait=500\n"));
     EXPECT_TRUE(log.has("lockTarget(msWait=500) returning JEX_SUCCESS\n"));
-    EXPECT_EQ(2u, log.count("JexJtag_target_lock() returning status=JEXJTAG_LOCKED_ME\n"));
-    EXPECT_TRUE(log.has("unlockTarget() returning JEX_SUCCESS\n"));
-    EXPECT_TRUE(log.has("JexJtag_target_getLockStatus() returning status=JEXJTAG_UNLOCKED\n"));
 }
 
 TEST_F(LockApiTest, ClosingALockedTargetDoesNotUnlockIt)
@@ -136,7 +132,6 @@ TEST_F(LockApiTest, CleanLocksUsesATemporaryUsbCableInstanceAndRefusesWhileATarg
     EXPECT_EQ(0u, got[3].find("JexPlugin_destroy"));
     EXPECT_NE(std::string::npos,
               log.text().find("Session::m_pluginManager->createPluginInstance(type=ormund_usbcable), returned 0x"));
-    EXPECT_TRUE(log.has("cleanLocks() returning JEX_SUCCESS\n"));
     // The temporary target object is gone again: a target opens as usual.
     EXPECT_EQ(JEX_FAILURE, JexJtag_target_close(h));
     EXPECT_EQ(JEX_SUCCESS, open("recording"));

@@ -143,7 +143,6 @@ TEST_F(TapApiTest, NavigateFlushesAndWaitsOnlyWhenAskedAndTracesStateNames)
         "navigateTAP newState=40 clockRepeat=1", "flush"};
     EXPECT_EQ(expected, calls());
 
-    EXPECT_TRUE(log.has("JexJtag_tap_navigate() handle=" + hs + ", clockRepeat=4, microSeconds=0\n"));
     EXPECT_TRUE(log.has("nagivateTAP(newState=JEXJTAG_SHIFT_IR, clockRepeat=4) returning JEX_SUCCESS\n"));
     EXPECT_TRUE(log.has("nagivateTAP(newState=, clockRepeat=0) returning JEX_SUCCESS\n"));
     EXPECT_TRUE(log.has("JexJtag_tap_navigate() newState=unknown(40)\n"));
@@ -188,7 +187,6 @@ TEST_F(TapApiTest, DeviceIdcodeComesBackAsBitTextWithinTheBuffer)
     EXPECT_EQ(text, std::string(buf));
     EXPECT_EQ('x', buf[33]);
     EXPECT_TRUE(log.has("getDeviceIdcode(deviceIndex=0) returning 362d093\n"));
-    EXPECT_TRUE(log.has("JexJtag_tap_getDeviceIdcode() returning idcode=" + text + "\n"));
 
     std::memset(buf, 'x', sizeof buf);
     EXPECT_EQ(JEX_SUCCESS, JexJtag_tap_getDeviceIdcode(h, 0, buf, 32)); // no room for a terminator
@@ -243,8 +241,6 @@ TEST_F(TapApiTest, AutodetectSetsIRLengthsFromTheDeviceDatabase)
     };
     EXPECT_EQ(expected, calls());
     const std::string hs = std::to_string(h);
-    EXPECT_TRUE(log.has("JexJtag_tap_autodetectChain() handle=" + hs + ", algorithm=JEXJTAG_SCAN_WALKING_ONES\n"));
-    EXPECT_TRUE(log.has("JexJtag_tap_autodetectChain() handle=" + hs + "\n"));
     EXPECT_TRUE(log.has("setIRLength(deviceIndex=1, irlen=6) returning JEX_SUCCESS\n"));
 }
 
@@ -257,8 +253,6 @@ TEST_F(TapApiTest, AutodetectStopsWhenInterrogationFailsAndIgnoresRefusedLengths
     {
         LogCapture log(3);
         EXPECT_EQ(JEX_FAILURE, JexJtag_tap_interrogateChain(h, 9));
-        EXPECT_TRUE(log.has("JexJtag_tap_interrogateChain() handle=" + std::to_string(h) + ", algorithm=9\n"));
-        EXPECT_TRUE(log.has("interrogate() returning JEX_FAILURE\n"));
     }
     JexJtag_target_close(h);
 

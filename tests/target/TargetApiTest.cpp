@@ -260,8 +260,6 @@ TEST_F(TargetApiTest, SendCommandPassesBuffersAndContextThrough)
     EXPECT_EQ("sendCommand command=reset in=\x01\x02\x03 inLength=3 out=" + pointerText(out) + " outLength=16 handle=" +
                   std::to_string(h) + " callerData=0xbeef",
               got[0]);
-    EXPECT_TRUE(log.has("JexJtag_target_sendCommand() handle=" + std::to_string(h) +
-                        ", cmd=reset, inbuflen=3, outbuflen=16\n"));
     EXPECT_TRUE(log.has("sendCommand(cmd=reset, inbuflen=3, outbuflen=4) returning JEX_SUCCESS\n"));
 
     // "get" and "set" in any case show their text; it is read no further than inbuflen.
@@ -294,13 +292,7 @@ TEST_F(TargetApiTest, PinsWaitingAndFlushReachThePlugin)
     EXPECT_EQ("flush", got[4]);
 
     const std::string hs = std::to_string(h);
-    EXPECT_TRUE(log.has("JexJtag_target_setPin() handle=" + hs + ", pin=JEXJTAG_TMS, value=1\n"));
-    EXPECT_TRUE(log.has("JexJtag_target_getPin() handle=" + hs + ", pin=JEXJTAG_TDO\n"));
     EXPECT_TRUE(log.has("getPin(pin=1, *value=1) returning JEX_SUCCESS\n"));
-    EXPECT_TRUE(log.has("JexJtag_target_getPin() returning value=1\n"));
-    EXPECT_TRUE(log.has("JexJtag_target_pulsePin() handle=" + hs + ", pin=7, count=12\n"));
-    EXPECT_TRUE(log.has("JexJtag_target_waitTime() handle=" + hs + ", us=250\n"));
-    EXPECT_TRUE(log.has("flush() returning JEX_SUCCESS\n"));
 }
 
 TEST_F(TargetApiTest, GetInfoCopiesTheRecordAndRefusesANullOne)
