@@ -50,7 +50,6 @@ TEST_F(SessionTargetListTest, HostsListTargetsWithNamesAndDescriptions)
     ASSERT_EQ(JEX_SUCCESS, JexJtag_session_getTargetXMLSizeByIndex(h, 2, &size));
     EXPECT_EQ(xml.size() + 1, size);
 
-    LogCapture log(3);
     std::vector<char> buf(size, 'x');
     char name[64], plugin[64];
     ASSERT_EQ(JEX_SUCCESS,

@@ -143,8 +143,6 @@ TEST_F(TapApiTest, NavigateFlushesAndWaitsOnlyWhenAskedAndTracesStateNames)
         "navigateTAP newState=40 clockRepeat=1", "flush"};
     EXPECT_EQ(expected, calls());
 
-    EXPECT_TRUE(log.has("nagivateTAP(newState=JEXJTAG_SHIFT_IR, clockRepeat=4) returning JEX_SUCCESS\n"));
-    EXPECT_TRUE(log.has("nagivateTAP(newState=, clockRepeat=0) returning JEX_SUCCESS\n"));
     EXPECT_TRUE(log.has("JexJtag_tap_navigate() newState=unknown(40)\n"));
     EXPECT_TRUE(log.has("Slept for 2500 microSeconds...\n"));
 }
@@ -182,11 +180,9 @@ TEST_F(TapApiTest, DeviceIdcodeComesBackAsBitTextWithinTheBuffer)
     const std::string text = bits(0x0362D093u);
     char buf[40];
     std::memset(buf, 'x', sizeof buf);
-    LogCapture log(3);
     EXPECT_EQ(JEX_SUCCESS, JexJtag_tap_getDeviceIdcode(h, 0, buf, 33));
     EXPECT_EQ(text, std::string(buf));
     EXPECT_EQ('x', buf[33]);
-    EXPECT_TRUE(log.has("getDeviceIdcode(deviceIndex=0) returning 362d093\n"));
 
     std::memset(buf, 'x', sizeof buf);
     EXPECT_EQ(JEX_SUCCESS, JexJtag_tap_getDeviceIdcode(h, 0, buf, 32)); // no room for a terminator
@@ -227,7 +223,6 @@ TEST_F(TapApiTest, AutodetectSetsIRLengthsFromTheDeviceDatabase)
     const unsigned h = openTarget({"devices=11111111:5,2345678F:9,33333333:7"});
     const std::string list = bits(0x2345678Fu) + " 6 1 0 TESTDEVICE\n";
     ASSERT_EQ(JEX_SUCCESS, JexJtag_db_addDeviceData(h, "test.lst", list.c_str(), static_cast<unsigned>(list.size())));
-    LogCapture log(3);
     EXPECT_EQ(JEX_SUCCESS, JexJtag_tap_autodetectChain(h, JEXJTAG_SCAN_WALKING_ONES));
     const std::vector<std::string> expected = {
         "interrogate",
@@ -241,7 +236,6 @@ TEST_F(TapApiTest, AutodetectSetsIRLengthsFromTheDeviceDatabase)
     };
     EXPECT_EQ(expected, calls());
     const std::string hs = std::to_string(h);
-    EXPECT_TRUE(log.has("setIRLength(deviceIndex=1, irlen=6) returning JEX_SUCCESS\n"));
 }
 
 TEST_F(TapApiTest, AutodetectStopsWhenInterrogationFailsAndIgnoresRefusedLengths)
@@ -251,7 +245,6 @@ TEST_F(TapApiTest, AutodetectStopsWhenInterrogationFailsAndIgnoresRefusedLengths
     EXPECT_EQ(std::vector<std::string>{"interrogate"}, calls());
     // Interrogating alone ignores the algorithm and answers what the plug-in does.
     {
-        LogCapture log(3);
         EXPECT_EQ(JEX_FAILURE, JexJtag_tap_interrogateChain(h, 9));
     }
     JexJtag_target_close(h);
