@@ -74,6 +74,15 @@ TEST(ScanOutputTest, IdcodeTextThatIsNotAPlainNumberIsShownAsItIs)
     EXPECT_NE(std::string::npos, textOf(writeScanText, odd).find("XXXX1011101000000000010001110111"));
 }
 
+TEST(ScanOutputTest, NegativeIRLengthFromThePluginIsUnknown)
+{
+    ScanResult r = twoDeviceChain();
+    r.devices[1].irLength = static_cast<unsigned>(-1);
+    EXPECT_NE(std::string::npos, textOf(writeScanText, r).find("  1  0x12345678  unknown  (unknown)\n"))
+        << textOf(writeScanText, r);
+    EXPECT_TRUE(jsonOf(writeScanJson, r)["devices"][1]["ir_length"].isNull());
+}
+
 TEST(TargetsOutputTest, TextAndJsonWithAndWithoutDescriptors)
 {
     TargetsResult r;
