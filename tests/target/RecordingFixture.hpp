@@ -8,7 +8,6 @@
 #include <cstdint>
 #include <cstdio>
 #include <algorithm>
-#include <bitset>
 #include <filesystem>
 #include <sstream>
 #include <string>
@@ -20,22 +19,10 @@
 
 namespace targettest {
 
-struct Message {
-    unsigned handle;
-    unsigned type;
-    std::string text;
-};
-
-inline std::vector<Message>& messages()
-{
-    static std::vector<Message> list;
-    return list;
-}
-inline void keepMessage(unsigned handle, unsigned type, const char* text)
-{
-    messages().push_back({handle, type, text ? text : ""});
-}
-
+using testsupport::HostMessage;
+using testsupport::hostMessages;
+using testsupport::idcodeText;
+using testsupport::keepHostMessage;
 using recording::pointerText;
 
 // A pointer as the library's traces print it: "0x%08llX", or "NULL".
@@ -57,7 +44,7 @@ protected:
         for (const char* module : {"RecordingPlugin", "RecordingPluginB"}) installModule(module);
     }
 
-    void SetUp() override { messages().clear(); }
+    void SetUp() override { hostMessages().clear(); }
 
     void TearDown() override
     {
@@ -83,7 +70,7 @@ protected:
     unsigned createSession()
     {
         unsigned handle = 0;
-        EXPECT_EQ(JEX_SUCCESS, JexJtag_session_create(keepMessage, 0, nullptr, &handle));
+        EXPECT_EQ(JEX_SUCCESS, JexJtag_session_create(keepHostMessage, 0, nullptr, &handle));
         m_handle = handle;
         return handle;
     }
@@ -136,8 +123,5 @@ protected:
     testsupport::ScopedEnv m_config;
     unsigned m_handle = kNoSession;
 };
-
-// The 32-character '0'/'1' text of code, bit 31 first.
-inline std::string bits(unsigned code) { return std::bitset<32>(code).to_string(); }
 
 } // namespace targettest

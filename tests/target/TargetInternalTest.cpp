@@ -1,6 +1,6 @@
-// The target classes from inside the library: the session's target slot,
-// a Target without implementation, an implementation without plug-in
-// instance, and the TAP state names.
+// The target classes from inside the library: a Target without
+// implementation and an implementation without plug-in instance fail
+// every call instead of following a null pointer.
 
 #include <gtest/gtest.h>
 
@@ -11,7 +11,6 @@
 #include "session/Session.hpp"
 #include "session/SessionRegistry.hpp"
 #include "support/TestSupport.hpp"
-#include "target/TapStateText.hpp"
 #include "target/Target.hpp"
 #include "target/Vivedoru10TargetImpl.hpp"
 
@@ -28,32 +27,6 @@ protected:
     testsupport::IsolatedEnvironment m_env;
     unsigned m_handle = 0;
 };
-
-TEST_F(TargetInternalTest, TheSlotHoldsOneTargetAtIndexZero)
-{
-    JexRT::Session* s = session();
-    EXPECT_EQ(nullptr, s->getTarget(0));
-    JexRT::Target* first = s->createTarget(0);
-    ASSERT_NE(nullptr, first);
-    EXPECT_EQ(first, s->getTarget(0));
-    EXPECT_EQ(first, JexRT::findTarget(m_handle));
-    EXPECT_FALSE(first->isOpen());
-
-    // Other indices hold nothing and leave index 0 alone.
-    EXPECT_EQ(nullptr, s->getTarget(1));
-    EXPECT_EQ(nullptr, s->createTarget(1));
-    EXPECT_EQ(nullptr, JexRT::findTarget(m_handle | 1u));
-    s->destroyTarget(1);
-    EXPECT_EQ(first, s->getTarget(0));
-
-    // A new target replaces the old one.
-    JexRT::Target* second = s->createTarget(0);
-    ASSERT_NE(nullptr, second);
-    EXPECT_EQ(second, s->getTarget(0));
-    s->destroyTarget(0);
-    EXPECT_EQ(nullptr, s->getTarget(0));
-    s->destroyTarget(0);
-}
 
 TEST_F(TargetInternalTest, ATargetWithoutImplementationFailsEverything)
 {
@@ -109,15 +82,6 @@ TEST_F(TargetInternalTest, AnImplementationWithoutInstanceSaysSo)
     EXPECT_EQ(JEX_FAILURE, impl.getOption("key", value, &size));
     EXPECT_EQ("untouched", value);
     EXPECT_EQ(7u, log.count("m_plugin is NULL!\n"));
-}
-
-// The names inside the table show in TapApiTest's trace lines; these are the edges.
-TEST(TapStateText, NamesTheSixteenStatesAndNothingPastTheTable)
-{
-    EXPECT_STREQ("JEXJTAG_TEST_LOGIC_RESET", JexRT::TapStateText(0).c_str());
-    EXPECT_STREQ("JEXJTAG_UPDATE_IR", JexRT::TapStateText(15).c_str());
-    EXPECT_STREQ("unknown(4294967295)", JexRT::TapStateText(0xFFFFFFFFu).c_str());
-    EXPECT_EQ(nullptr, JexRT::TapStateText::tableName(17));
 }
 
 } // namespace
