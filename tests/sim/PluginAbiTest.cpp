@@ -14,20 +14,8 @@ namespace {
 const std::string kModule = std::string(JEXJTAG_TEST_BUILD_DIR) + "/lib/plugins/jexjtag/jtag_sim/jtag_sim.so";
 constexpr uint32_t kSession = 0x00010000;
 
-std::vector<std::pair<uint32_t, std::string>> g_messages;
-
-void recordMessage(uint32_t session, uint32_t type, const char* text)
-{
-    EXPECT_EQ(session, kSession);
-    g_messages.emplace_back(type, text ? text : "");
-}
-
-bool sawMessage(uint32_t type, const std::string& part)
-{
-    for (const auto& [t, text] : g_messages)
-        if (t == type && text.find(part) != std::string::npos) return true;
-    return false;
-}
+using testsupport::hostMessages;
+using testsupport::sawHostMessage;
 
 class PluginAbi : public ::testing::Test {
 protected:
@@ -42,7 +30,7 @@ protected:
         ASSERT_TRUE(create && destroy && loaded && setCallbacks && module->rawSymbol("JexPlugin_unloaded"));
         loaded();
         JexPluginCallbacks callbacks{};
-        callbacks.sendMessage = &recordMessage;
+        callbacks.sendMessage = &testsupport::keepHostMessage;
         setCallbacks(&callbacks); // the table lives only for this call
     }
     static void TearDownTestSuite()
@@ -52,7 +40,7 @@ protected:
         module = nullptr;
     }
 
-    void SetUp() override { g_messages.clear(); }
+    void SetUp() override { hostMessages().clear(); }
     void TearDown() override
     {
         for (JexPluginInstance* i : instances) destroy(i);
@@ -132,7 +120,7 @@ TEST_F(PluginAbi, DeviceOverridesLastUntilTheNextInterrogation)
     EXPECT_EQ(i->ops->getDeviceIdcode(i, 3), 0u);
     EXPECT_EQ(i->ops->setIRLength(i, 3, 4), JEX_FAILURE);
     EXPECT_EQ(i->ops->setDeviceID(i, 3, 1), JEX_FAILURE);
-    EXPECT_TRUE(sawMessage(JEX_MSG_ERROR, "outside the chain"));
+    EXPECT_TRUE(sawHostMessage(JEX_MSG_ERROR, "outside the chain"));
 
     EXPECT_EQ(i->ops->setIRLength(i, 1, 0), JEX_SUCCESS);
     EXPECT_EQ(i->ops->setDeviceID(i, 1, 0x12345679), JEX_SUCCESS);
@@ -176,7 +164,7 @@ TEST_F(PluginAbi, BadArgumentsAreRefused)
     // Only stable states can be held for clocks.
     EXPECT_EQ(i->ops->navigateTAP(i, JEXJTAG_RUN_TEST_IDLE, 100), JEX_SUCCESS);
     EXPECT_EQ(i->ops->navigateTAP(i, JEXJTAG_CAPTURE_DR, 1), JEX_FAILURE);
-    EXPECT_TRUE(sawMessage(JEX_MSG_ERROR, "Capture-DR"));
+    EXPECT_TRUE(sawHostMessage(JEX_MSG_ERROR, "Capture-DR"));
     EXPECT_EQ(i->ops->navigateTAP(i, JEXJTAG_CAPTURE_DR, 0), JEX_SUCCESS);
     EXPECT_EQ(i->ops->navigateTAP(i, JEXJTAG_STATE_SIZE, 0), JEX_FAILURE);
     EXPECT_EQ(i->ops->flush(i), JEX_SUCCESS);
@@ -203,13 +191,14 @@ TEST_F(PluginAbi, CommandsGetAndSetOptions)
     EXPECT_EQ(get(i, "colour"), "<failed>");
     EXPECT_EQ(set(i, "noequals"), JEX_FAILURE);
 
-    g_messages.clear();
+    hostMessages().clear();
     const uint8_t in[] = "x";
     uint32_t len = 0;
     EXPECT_EQ(i->ops->sendCommand(i, "reboot", in, 2, nullptr, &len, nullptr), JEX_FAILURE);
-    ASSERT_EQ(g_messages.size(), 1u);
-    EXPECT_EQ(g_messages[0].first, JEX_MSG_ERROR);
-    EXPECT_NE(g_messages[0].second.find("reboot"), std::string::npos);
+    ASSERT_EQ(hostMessages().size(), 1u);
+    EXPECT_EQ(hostMessages()[0].handle, kSession) << "the message names the instance's session";
+    EXPECT_EQ(hostMessages()[0].type, unsigned{JEX_MSG_ERROR});
+    EXPECT_NE(hostMessages()[0].text.find("reboot"), std::string::npos);
     EXPECT_EQ(i->ops->sendCommand(i, nullptr, in, 2, nullptr, &len, nullptr), JEX_FAILURE);
 }
 
