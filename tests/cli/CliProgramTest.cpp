@@ -2,7 +2,6 @@
 
 #include <gtest/gtest.h>
 
-#include <stdlib.h>
 #include <unistd.h>
 
 #include <string>
@@ -10,45 +9,33 @@
 #include <vector>
 
 #include "MiniJson.hpp"
+#include "ProgramRunner.hpp"
 #include "jexjtag/jexjtag.h"
-#include "net/ChildProcess.hpp"
+
+using clitest::ProgramRunner;
+using clitest::RunResult;
 
 namespace {
 
 bool contains(const std::string& text, const std::string& part) { return text.find(part) != std::string::npos; }
 
-struct RunResult {
-    int exitCode = -1; // 128 + signal when killed, -1 when it did not end in time
-    std::string out;
-    std::string err;
-};
-
 class CliProgramTest : public ::testing::Test {
 protected:
-    // Each test drives its own simulated port, with lock files and a home of
-    // its own, and no log, plug-in or data settings from outside.
+    // Each test drives its own simulated port, with lock files of its own.
     CliProgramTest()
     {
-        std::filesystem::create_directories(m_dir / "home");
         std::filesystem::create_directories(m_lockDir);
-        for (const char* name : {"JEXJTAG_LOG_LEVEL", "JEXJTAG_LOG_FILE", "JEXJTAG_PLUGIN_DIR", "JEXJTAG_DATA_DIR"})
-            unsetenv(name); // the ScopedEnv members put back what was there
+        runner.setEnv("JEXJTAG_LOCK_DIR", m_lockDir);
     }
 
-    // jexjtag with args and the test's own port; every wait is bounded.
+    // jexjtag with args and the test's own port.
     RunResult run(std::vector<std::string> args, bool withPort = true)
     {
         if (withPort) {
             args.push_back("--arg");
             args.push_back("port=" + m_port);
         }
-        args.insert(args.begin(), std::string(JEXJTAG_TEST_BUILD_DIR) + "/bin/jexjtag");
-        nettest::ChildProcess child(args);
-        RunResult r;
-        r.out = child.readAll();
-        r.exitCode = child.wait();
-        r.err = child.errorText();
-        return r;
+        return runner.run(args);
     }
     // The same, expecting success and valid JSON on stdout.
     minijson::Value runJson(std::vector<std::string> args)
@@ -60,13 +47,9 @@ protected:
         return minijson::parse(r.out);
     }
 
-    testsupport::TempDir m_dir;
-    const std::string m_lockDir = (m_dir / "locks").string();
+    ProgramRunner runner;
+    const std::string m_lockDir = (runner.dir() / "locks").string();
     const std::string m_port = "clitest-" + std::to_string(getpid());
-    testsupport::ScopedEnv m_home{"HOME", (m_dir / "home").string()};
-    testsupport::ScopedEnv m_locks{"JEXJTAG_LOCK_DIR", m_lockDir};
-    testsupport::ScopedEnv m_logLevel{"JEXJTAG_LOG_LEVEL", ""}, m_logFile{"JEXJTAG_LOG_FILE", ""};
-    testsupport::ScopedEnv m_pluginDir{"JEXJTAG_PLUGIN_DIR", ""}, m_dataDir{"JEXJTAG_DATA_DIR", ""};
 };
 
 // A usage error: exit 2, one "jexjtag: " line and a hint on stderr, nothing on stdout.
@@ -213,14 +196,14 @@ TEST_F(CliProgramTest, LookupNamesKnownAndReportsUnknownIdcodes)
 
 TEST_F(CliProgramTest, DatadirChoosesTheDeviceList)
 {
-    testsupport::writeFile(m_dir.path() / "data" / "idcode.lst",
+    testsupport::writeFile(runner.dir() / "data" / "idcode.lst",
                            "XXXX_0001_0010_0011_0100_0101_0110_0111  5 1 0 MY_TEST_PART\n");
     const minijson::Value doc =
-        runJson({"lookup", "0x01234567", "--datadir", (m_dir.path() / "data").string()});
+        runJson({"lookup", "0x01234567", "--datadir", (runner.dir() / "data").string()});
     EXPECT_EQ("MY_TEST_PART", doc["name"].str());
     EXPECT_EQ(5u, doc["ir_length"].uint());
 
-    expectFailure(run({"lookup", "0x1", "--datadir", (m_dir.path() / "missing").string()}),
+    expectFailure(run({"lookup", "0x1", "--datadir", (runner.dir() / "missing").string()}),
                   "cannot create a library session");
 }
 
@@ -310,6 +293,7 @@ TEST_F(CliProgramTest, InfoShowsTheRecordAndTheApiVersion)
 TEST_F(CliProgramTest, ALockHeldElsewhereIsReportedClearly)
 {
     // This process holds the port's lock through the library.
+    testsupport::ScopedEnv lockDir("JEXJTAG_LOCK_DIR", m_lockDir);
     unsigned handle = 0;
     ASSERT_EQ(JEX_SUCCESS, JexJtag_session_create(nullptr, 0, nullptr, &handle));
     const std::string portArg = "port=" + m_port;
@@ -332,7 +316,7 @@ TEST_F(CliProgramTest, ALockHeldElsewhereIsReportedClearly)
 
 TEST_F(CliProgramTest, LogLevelAndVerboseReachTheLibrary)
 {
-    const std::string logFile = (m_dir.path() / "lib.log").string();
+    const std::string logFile = (runner.dir() / "lib.log").string();
     RunResult r = run({"scan", "--log-level", "3", "--log-file", logFile});
     EXPECT_EQ(0, r.exitCode) << r.err;
     const std::string log = testsupport::readFile(logFile);
