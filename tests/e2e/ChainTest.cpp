@@ -73,8 +73,8 @@ TEST_F(E2eChainTest, TypicalUseFromSessionToDestroy)
     ASSERT_EQ(JEX_SUCCESS, JexJtag_session_destroy(m_handle));
     m_handle = 0;
 
-    EXPECT_TRUE(hostMessagesOfType(JEX_MSG_ERROR).empty());
-    EXPECT_TRUE(hostMessagesOfType(JEX_MSG_WARNING).empty());
+    EXPECT_TRUE(messagesOfType(JEX_MSG_ERROR).empty());
+    EXPECT_TRUE(messagesOfType(JEX_MSG_WARNING).empty());
 }
 
 TEST_F(E2eChainTest, AutodetectCorrectsGuessedIrLengthsFromTheDeviceDatabase)
@@ -82,7 +82,7 @@ TEST_F(E2eChainTest, AutodetectCorrectsGuessedIrLengthsFromTheDeviceDatabase)
     // The last device's Capture-IR value (binary 00000101) shows two places
     // where an IR could start; the plug-in's scan guesses 4, 8, 6 and says so.
     ASSERT_EQ(JEX_SUCCESS, open(kDap + "," + kArtix + "," + kEcp5 + ":capture=0x05"));
-    const std::vector<std::string> warnings = hostMessagesOfType(JEX_MSG_WARNING);
+    const std::vector<std::string> warnings = messagesOfType(JEX_MSG_WARNING);
     ASSERT_EQ(1u, warnings.size());
     EXPECT_TRUE(contains(warnings[0], "assuming 4,8,6")) << warnings[0];
     EXPECT_EQ(8u, irLength(1));
@@ -125,7 +125,7 @@ TEST_F(E2eChainTest, AutodetectGivesDevicesTheDatabaseDoesNotKnowIrLengthZero)
     EXPECT_EQ(0u, irLength(0));
     EXPECT_EQ(6u, irLength(1));
     EXPECT_EQ(0u, irLength(2));
-    EXPECT_TRUE(hostMessagesOfType(JEX_MSG_ERROR).empty());
+    EXPECT_TRUE(messagesOfType(JEX_MSG_ERROR).empty());
 }
 
 TEST_F(E2eChainTest, DeviceShiftsAddressOnlyTheirDevice)
@@ -152,7 +152,7 @@ TEST_F(E2eChainTest, DeviceShiftsAddressOnlyTheirDevice)
     std::vector<uint8_t> tdo(4);
     EXPECT_EQ(JEX_FAILURE, JexJtag_tap_shiftDeviceDR(m_handle, 3, JEXJTAG_SHIFT_READ, JEXJTAG_RUN_TEST_IDLE, nullptr,
                                                      32, nullptr, tdo.data(), nullptr, nullptr));
-    const std::vector<std::string> errors = hostMessagesOfType(JEX_MSG_ERROR);
+    const std::vector<std::string> errors = messagesOfType(JEX_MSG_ERROR);
     ASSERT_EQ(1u, errors.size());
     EXPECT_EQ("jtag_sim: device 3 is outside the chain of 3 devices", errors[0]);
 }
@@ -263,5 +263,5 @@ TEST_F(E2eChainTest, PinsWalkTheTapControllerAndReadTheIdcodes)
 
     // TDO is an input: setting it fails, and the host is told.
     EXPECT_EQ(JEX_FAILURE, JexJtag_target_setPin(m_handle, JEXJTAG_TDO, 1));
-    EXPECT_EQ(1u, hostMessagesOfType(JEX_MSG_ERROR).size());
+    EXPECT_EQ(1u, messagesOfType(JEX_MSG_ERROR).size());
 }

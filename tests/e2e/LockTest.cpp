@@ -89,7 +89,7 @@ TEST_F(E2eLockTest, AnotherProcessHoldsThePortUntilItIsKilled)
     unsigned status = 0;
     EXPECT_EQ(JEX_FAILURE, JexJtag_target_lock(m_handle, 100, &status));
     EXPECT_EQ(unsigned{JEXJTAG_UNLOCKED}, status);
-    const std::vector<std::string> errors = hostMessagesOfType(JEX_MSG_ERROR);
+    const std::vector<std::string> errors = messagesOfType(JEX_MSG_ERROR);
     ASSERT_EQ(1u, errors.size());
     EXPECT_EQ("jtag_sim: port " + m_port + " is locked by another process (pid " + std::to_string(pid) + " port " +
                   m_port + ")",
@@ -111,7 +111,7 @@ TEST_F(E2eLockTest, LockObjectsNestAndTheOutermostReleases)
     // A second session of this process opens the same port: it contends
     // for the lock like another program would.
     unsigned other = 0;
-    ASSERT_EQ(JEX_SUCCESS, JexJtag_session_create(keepHostMessage, 0, nullptr, &other));
+    ASSERT_EQ(JEX_SUCCESS, JexJtag_session_create(keepMessage, 0, nullptr, &other));
     ASSERT_EQ(JEX_SUCCESS, open(kThreeDevices, {}, nullptr, other));
     unsigned status = 0;
 

@@ -18,10 +18,10 @@
 namespace e2e {
 
 using testsupport::bitsOf;
-using testsupport::hostMessages;
-using testsupport::hostMessagesOfType;
+using testsupport::messages;
+using testsupport::messagesOfType;
 using testsupport::idcodeText;
-using testsupport::keepHostMessage;
+using testsupport::keepMessage;
 using testsupport::valueOf;
 
 // The default chain of the plug-in, written out (device 0, nearest TDO, first).
@@ -48,8 +48,8 @@ protected:
 
     void SetUp() override
     {
-        hostMessages().clear();
-        ASSERT_EQ(JEX_SUCCESS, JexJtag_session_create(keepHostMessage, 0, nullptr, &m_handle));
+        messages().clear();
+        ASSERT_EQ(JEX_SUCCESS, JexJtag_session_create(keepMessage, 0, nullptr, &m_handle));
     }
 
     void TearDown() override

@@ -58,7 +58,7 @@ TEST_F(E2eTargetTest, OptionsAndTargetInformationComeFromTheCable)
     EXPECT_EQ(JEX_FAILURE, JexJtag_target_setOption(m_handle, "frequency", "fast"));
     EXPECT_EQ("125000", option("frequency"));
     EXPECT_EQ(JEX_FAILURE, JexJtag_target_setOption(m_handle, "colour", "blue"));
-    const std::vector<std::string> errors = hostMessagesOfType(JEX_MSG_ERROR);
+    const std::vector<std::string> errors = messagesOfType(JEX_MSG_ERROR);
     ASSERT_EQ(2u, errors.size());
     EXPECT_EQ("jtag_sim: frequency: \"fast\" is not a frequency of 1 Hz to 1000M", errors[0]);
     EXPECT_TRUE(startsWith(errors[1], "jtag_sim: unknown option \"colour\"")) << errors[1];
@@ -94,14 +94,14 @@ TEST_F(E2eTargetTest, AvoidFirmwareUpdateClosesACableWithNewFirmware)
 TEST_F(E2eTargetTest, FailedOpensLeaveNoTargetAndTellTheHostWhy)
 {
     EXPECT_EQ(JEX_FAILURE, open("0x12:4")); // an IDCODE needs bit 0 set
-    std::vector<std::string> errors = hostMessagesOfType(JEX_MSG_ERROR);
+    std::vector<std::string> errors = messagesOfType(JEX_MSG_ERROR);
     ASSERT_EQ(1u, errors.size());
     EXPECT_TRUE(startsWith(errors[0], "jtag_sim: chain: ")) << errors[0];
     EXPECT_EQ(JEX_FAILURE, JexJtag_target_close(m_handle));
 
     const char* argv[] = {"port=x"};
     EXPECT_EQ(JEX_FAILURE, JexJtag_target_open(m_handle, "no_such_cable", nullptr, 1, argv, nullptr));
-    errors = hostMessagesOfType(JEX_MSG_ERROR);
+    errors = messagesOfType(JEX_MSG_ERROR);
     ASSERT_EQ(2u, errors.size());
     EXPECT_EQ("Could not open plugin of the type: no_such_cable. Please check to make sure the correct plug-in for "
               "this type is installed.\n",

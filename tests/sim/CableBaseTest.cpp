@@ -53,7 +53,7 @@ protected:
 
 TEST(CableBase, ATransportFailureFailsTheOperationAndResetsTheTapNextTime)
 {
-    testsupport::hostMessages().clear();
+    testsupport::messages().clear();
     const JexPluginCallbacks callbacks = simtest::hostCallbacks();
     jexjtag::PluginHost::set(&callbacks);
     FlakyCable cable;
@@ -62,7 +62,7 @@ TEST(CableBase, ATransportFailureFailsTheOperationAndResetsTheTapNextTime)
 
     cable.wire.broken = true;
     EXPECT_EQ(cable.navigateTAP(JEXJTAG_PAUSE_DR, 0), JEX_FAILURE);
-    EXPECT_TRUE(testsupport::sawHostMessage(JEX_MSG_ERROR, "flaky: the adapter went away"));
+    EXPECT_TRUE(testsupport::sawMessage(JEX_MSG_ERROR, "flaky: the adapter went away"));
 
     cable.wire.broken = false;
     cable.wire.moves.clear();

@@ -14,8 +14,8 @@ namespace {
 const std::string kModule = std::string(JEXJTAG_TEST_BUILD_DIR) + "/lib/plugins/jexjtag/jtag_sim/jtag_sim.so";
 constexpr uint32_t kSession = 0x00010000;
 
-using testsupport::hostMessages;
-using testsupport::sawHostMessage;
+using testsupport::messages;
+using testsupport::sawMessage;
 
 class PluginAbi : public ::testing::Test {
 protected:
@@ -30,7 +30,7 @@ protected:
         ASSERT_TRUE(create && destroy && loaded && setCallbacks && module->rawSymbol("JexPlugin_unloaded"));
         loaded();
         JexPluginCallbacks callbacks{};
-        callbacks.sendMessage = &testsupport::keepHostMessage;
+        callbacks.sendMessage = &testsupport::keepMessage;
         setCallbacks(&callbacks); // the table lives only for this call
     }
     static void TearDownTestSuite()
@@ -40,7 +40,7 @@ protected:
         module = nullptr;
     }
 
-    void SetUp() override { hostMessages().clear(); }
+    void SetUp() override { messages().clear(); }
     void TearDown() override
     {
         for (JexPluginInstance* i : instances) destroy(i);
@@ -120,7 +120,7 @@ TEST_F(PluginAbi, DeviceOverridesLastUntilTheNextInterrogation)
     EXPECT_EQ(i->ops->getDeviceIdcode(i, 3), 0u);
     EXPECT_EQ(i->ops->setIRLength(i, 3, 4), JEX_FAILURE);
     EXPECT_EQ(i->ops->setDeviceID(i, 3, 1), JEX_FAILURE);
-    EXPECT_TRUE(sawHostMessage(JEX_MSG_ERROR, "outside the chain"));
+    EXPECT_TRUE(sawMessage(JEX_MSG_ERROR, "outside the chain"));
 
     EXPECT_EQ(i->ops->setIRLength(i, 1, 0), JEX_SUCCESS);
     EXPECT_EQ(i->ops->setDeviceID(i, 1, 0x12345679), JEX_SUCCESS);
@@ -164,7 +164,7 @@ TEST_F(PluginAbi, BadArgumentsAreRefused)
     // Only stable states can be held for clocks.
     EXPECT_EQ(i->ops->navigateTAP(i, JEXJTAG_RUN_TEST_IDLE, 100), JEX_SUCCESS);
     EXPECT_EQ(i->ops->navigateTAP(i, JEXJTAG_CAPTURE_DR, 1), JEX_FAILURE);
-    EXPECT_TRUE(sawHostMessage(JEX_MSG_ERROR, "Capture-DR"));
+    EXPECT_TRUE(sawMessage(JEX_MSG_ERROR, "Capture-DR"));
     EXPECT_EQ(i->ops->navigateTAP(i, JEXJTAG_CAPTURE_DR, 0), JEX_SUCCESS);
     EXPECT_EQ(i->ops->navigateTAP(i, JEXJTAG_STATE_SIZE, 0), JEX_FAILURE);
     EXPECT_EQ(i->ops->flush(i), JEX_SUCCESS);
@@ -191,14 +191,14 @@ TEST_F(PluginAbi, CommandsGetAndSetOptions)
     EXPECT_EQ(get(i, "colour"), "<failed>");
     EXPECT_EQ(set(i, "noequals"), JEX_FAILURE);
 
-    hostMessages().clear();
+    messages().clear();
     const uint8_t in[] = "x";
     uint32_t len = 0;
     EXPECT_EQ(i->ops->sendCommand(i, "reboot", in, 2, nullptr, &len, nullptr), JEX_FAILURE);
-    ASSERT_EQ(hostMessages().size(), 1u);
-    EXPECT_EQ(hostMessages()[0].handle, kSession) << "the message names the instance's session";
-    EXPECT_EQ(hostMessages()[0].type, unsigned{JEX_MSG_ERROR});
-    EXPECT_NE(hostMessages()[0].text.find("reboot"), std::string::npos);
+    ASSERT_EQ(messages().size(), 1u);
+    EXPECT_EQ(messages()[0].handle, kSession) << "the message names the instance's session";
+    EXPECT_EQ(messages()[0].type, unsigned{JEX_MSG_ERROR});
+    EXPECT_NE(messages()[0].text.find("reboot"), std::string::npos);
     EXPECT_EQ(i->ops->sendCommand(i, nullptr, in, 2, nullptr, &len, nullptr), JEX_FAILURE);
 }
 

@@ -15,7 +15,7 @@ class SimCableTest : public ::testing::Test {
 protected:
     void SetUp() override
     {
-        testsupport::hostMessages().clear();
+        testsupport::messages().clear();
         const JexPluginCallbacks callbacks = simtest::hostCallbacks();
         jexjtag::PluginHost::set(&callbacks);
     }
@@ -93,7 +93,7 @@ TEST_F(SimCableTest, WaveformCanBeStartedAndStoppedByOption)
     ASSERT_EQ(set("vcd=" + path), JEX_SUCCESS);
     ASSERT_EQ(cable.navigateTAP(JEXJTAG_SHIFT_DR, 0), JEX_SUCCESS);
     EXPECT_EQ(set("chain=none:2"), JEX_FAILURE) << "the chain cannot change under a recording";
-    EXPECT_TRUE(testsupport::sawHostMessage(JEX_MSG_ERROR, "waveform"));
+    EXPECT_TRUE(testsupport::sawMessage(JEX_MSG_ERROR, "waveform"));
     ASSERT_EQ(set("vcd="), JEX_SUCCESS);
     ASSERT_EQ(cable.navigateTAP(JEXJTAG_RUN_TEST_IDLE, 0), JEX_SUCCESS);
 
@@ -115,5 +115,5 @@ TEST_F(SimCableTest, CloseReleasesEverything)
     jexcable::CableLock other("sim0", dir.str());
     EXPECT_TRUE(other.acquire(0));
     EXPECT_EQ(cable.flush(), JEX_FAILURE);
-    EXPECT_TRUE(testsupport::sawHostMessage(JEX_MSG_ERROR, "not open"));
+    EXPECT_TRUE(testsupport::sawMessage(JEX_MSG_ERROR, "not open"));
 }

@@ -37,11 +37,11 @@ inline jexsim::DeviceSpec noIdcode(uint32_t irLength, uint64_t capture = 1)
 using testsupport::bitsOf;
 using testsupport::valueOf;
 
-// Plug-in callbacks that keep what the plug-in sends in testsupport::hostMessages().
+// Plug-in callbacks that keep what the plug-in sends in testsupport::messages().
 inline JexPluginCallbacks hostCallbacks()
 {
     JexPluginCallbacks cb{};
-    cb.sendMessage = &testsupport::keepHostMessage;
+    cb.sendMessage = &testsupport::keepMessage;
     return cb;
 }
 

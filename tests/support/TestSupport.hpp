@@ -180,33 +180,33 @@ private:
     ScopedEnv m_data;
 };
 
-// The messages delivered to the host, in order: keepHostMessage serves as
+// The messages delivered to the host, in order: keepMessage serves as
 // a session's JexMessageCallback and as a plug-in's sendMessage callback.
-struct HostMessage {
+struct Message {
     unsigned handle;
     unsigned type;
     std::string text;
 };
-inline std::vector<HostMessage>& hostMessages()
+inline std::vector<Message>& messages()
 {
-    static std::vector<HostMessage> list;
+    static std::vector<Message> list;
     return list;
 }
-inline void keepHostMessage(unsigned handle, unsigned type, const char* text)
+inline void keepMessage(unsigned handle, unsigned type, const char* text)
 {
-    hostMessages().push_back({handle, type, text ? text : ""});
+    messages().push_back({handle, type, text ? text : ""});
 }
-inline std::vector<std::string> hostMessagesOfType(unsigned type)
+inline std::vector<std::string> messagesOfType(unsigned type)
 {
     std::vector<std::string> out;
-    for (const HostMessage& m : hostMessages())
+    for (const Message& m : messages())
         if (m.type == type) out.push_back(m.text);
     return out;
 }
 // True when a message of `type` contains `part`.
-inline bool sawHostMessage(unsigned type, const std::string& part)
+inline bool sawMessage(unsigned type, const std::string& part)
 {
-    for (const std::string& text : hostMessagesOfType(type))
+    for (const std::string& text : messagesOfType(type))
         if (text.find(part) != std::string::npos) return true;
     return false;
 }

@@ -103,9 +103,9 @@ TEST_F(LockApiTest, CleanLocksUsesATemporaryUsbCableInstanceAndRefusesWhileATarg
 
     // With a target open the locks are left alone, and so is the target.
     EXPECT_EQ(JEX_FAILURE, JexJtag_target_cleanLocks(h));
-    ASSERT_EQ(1u, hostMessages().size());
-    EXPECT_EQ(JEX_MSG_ERROR, hostMessages()[0].type);
-    EXPECT_EQ("The locks cannot be cleaned while a target is Open.", hostMessages()[0].text);
+    ASSERT_EQ(1u, messages().size());
+    EXPECT_EQ(JEX_MSG_ERROR, messages()[0].type);
+    EXPECT_EQ("The locks cannot be cleaned while a target is Open.", messages()[0].text);
     EXPECT_TRUE(calls().empty());
     EXPECT_EQ(JEX_SUCCESS, JexJtag_target_flush(h)); // the open target is untouched
     EXPECT_EQ(JEX_FAILURE, JexJtag_target_cleanLocks(h | 1u));

@@ -19,10 +19,10 @@
 
 namespace targettest {
 
-using testsupport::HostMessage;
-using testsupport::hostMessages;
+using testsupport::Message;
+using testsupport::messages;
 using testsupport::idcodeText;
-using testsupport::keepHostMessage;
+using testsupport::keepMessage;
 using recording::pointerText;
 
 // A pointer as the library's traces print it: "0x%08llX", or "NULL".
@@ -44,7 +44,7 @@ protected:
         for (const char* module : {"RecordingPlugin", "RecordingPluginB"}) installModule(module);
     }
 
-    void SetUp() override { hostMessages().clear(); }
+    void SetUp() override { messages().clear(); }
 
     void TearDown() override
     {
@@ -70,7 +70,7 @@ protected:
     unsigned createSession()
     {
         unsigned handle = 0;
-        EXPECT_EQ(JEX_SUCCESS, JexJtag_session_create(keepHostMessage, 0, nullptr, &handle));
+        EXPECT_EQ(JEX_SUCCESS, JexJtag_session_create(keepMessage, 0, nullptr, &handle));
         m_handle = handle;
         return handle;
     }

@@ -80,10 +80,10 @@ TEST_F(TargetApiTest, SecondOpenFailsAndClosesTheFirstTarget)
     EXPECT_EQ(0u, got[1].find("JexPlugin_destroy"));
     for (const std::string& line : record()) EXPECT_EQ(std::string::npos, line.find("RecordingPluginB: JexPlugin_create"));
 
-    ASSERT_EQ(1u, hostMessages().size());
-    EXPECT_EQ(h, hostMessages()[0].handle);
-    EXPECT_EQ(JEX_MSG_ERROR, hostMessages()[0].type);
-    EXPECT_EQ(kAlreadyOpen, hostMessages()[0].text);
+    ASSERT_EQ(1u, messages().size());
+    EXPECT_EQ(h, messages()[0].handle);
+    EXPECT_EQ(JEX_MSG_ERROR, messages()[0].type);
+    EXPECT_EQ(kAlreadyOpen, messages()[0].text);
     EXPECT_TRUE(log.has(kAlreadyOpen));
 
     EXPECT_EQ(JEX_FAILURE, JexJtag_target_close(h));
@@ -117,11 +117,11 @@ TEST_F(TargetApiTest, OpenWithoutAnInstanceReportsToTheHost)
     configure("create=null");
     EXPECT_EQ(JEX_FAILURE, open("recording"));
 
-    ASSERT_EQ(3u, hostMessages().size());
-    EXPECT_EQ(noPlugin, hostMessages()[0].text);
-    EXPECT_EQ("No valid targetName provided!\n", hostMessages()[1].text);
-    EXPECT_EQ(0u, hostMessages()[2].text.find("Could not open plugin of the type: recording."));
-    for (const HostMessage& m : hostMessages()) EXPECT_EQ(JEX_MSG_ERROR, m.type);
+    ASSERT_EQ(3u, messages().size());
+    EXPECT_EQ(noPlugin, messages()[0].text);
+    EXPECT_EQ("No valid targetName provided!\n", messages()[1].text);
+    EXPECT_EQ(0u, messages()[2].text.find("Could not open plugin of the type: recording."));
+    for (const Message& m : messages()) EXPECT_EQ(JEX_MSG_ERROR, m.type);
     // A null instance from the module is never given back.
     const std::vector<std::string> got = calls();
     ASSERT_EQ(1u, got.size());
