@@ -63,17 +63,6 @@ TEST(ScanOutputTest, TableListsEveryDeviceNearestTdoFirst)
     EXPECT_EQ(0u, textOf(writeScanText, one).find("jtag_sim: 1 device (device 0"));
 }
 
-TEST(ScanOutputTest, IdcodeTextThatIsNotAPlainNumberIsShownAsItIs)
-{
-    // The JSON fields of a scan are checked end to end in CliProgramTest.
-    ScanResult odd = twoDeviceChain();
-    odd.devices[0].idcodeBits = "XXXX1011101000000000010001110111";
-    const minijson::Value doc = jsonOf(writeScanJson, odd);
-    EXPECT_TRUE(doc["devices"][0]["idcode"].isNull());
-    EXPECT_EQ("XXXX1011101000000000010001110111", doc["devices"][0]["idcode_bits"].str());
-    EXPECT_NE(std::string::npos, textOf(writeScanText, odd).find("XXXX1011101000000000010001110111"));
-}
-
 TEST(ScanOutputTest, NegativeIRLengthFromThePluginIsUnknown)
 {
     ScanResult r = twoDeviceChain();

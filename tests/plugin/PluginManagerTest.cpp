@@ -91,26 +91,6 @@ TEST_F(PluginManagerTest, AModuleLackingAnyEntryPointIsRefusedAndFreedAgain)
     }
 }
 
-TEST_F(PluginManagerTest, ALoadedModuleIsToldLoadedThenGetsTheCompleteCallbackTable)
-{
-    PluginManager manager;
-    const std::string path = PluginTree::builtModule("test_counting_alpha").string();
-    PluginModule module;
-    ASSERT_EQ(JEX_SUCCESS, manager.loadModule("alpha", path, module));
-    EXPECT_EQ((Lines {"loaded", "setCallbacks complete"}), entries.of("alpha"));
-    EXPECT_EQ("alpha", module.name);
-    EXPECT_EQ(path, module.libraryPath);
-    EXPECT_TRUE(module.hasAllEntryPoints());
-
-    LogCapture log(3);
-    EXPECT_EQ(JEX_SUCCESS, manager.unloadModule(module));
-    EXPECT_TRUE(log.has("PluginManager::unloadModule() - Successfully unloaded plugin: " + path + "\n"));
-    EXPECT_EQ((Lines {"loaded", "setCallbacks complete", "unloaded"}), entries.of("alpha"));
-    EXPECT_EQ(JEX_FAILURE, manager.unloadModule(module));
-    EXPECT_TRUE(log.has("PluginManager::unloadModule() - Nothing to unload\n"));
-    EXPECT_EQ(1u, entries.count("alpha unloaded"));
-}
-
 TEST_F(PluginManagerTest, DiscoveryWalksTwoLevelsAndLoadsOnlyDescribedPlugins)
 {
     testsupport::writeFile(env.pluginRoot() / "README", "not a company");

@@ -61,16 +61,6 @@ TEST(ChainScanner, FindsEveryDeviceWithItsIrLength)
     }
 }
 
-TEST(ChainScanner, StatusBitsThatLookLikeABoundaryAreJoinedBack)
-{
-    // Device 0 captures binary 000101 (first out: 1,0,1,0,0,0): a stray 1,0.
-    const auto r = scan({simtest::device(0x0362D093, 6, 0x09, 0x02, 32, 0x05), simtest::device(0x4BA00477, 4)});
-    ASSERT_EQ(r.devices.size(), 2u);
-    EXPECT_TRUE(r.ambiguous);
-    EXPECT_EQ(r.devices[0].irLength, 6u);
-    EXPECT_EQ(r.devices[1].irLength, 4u);
-}
-
 TEST(ChainScanner, SplitRule)
 {
     struct Case {

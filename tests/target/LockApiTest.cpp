@@ -57,41 +57,6 @@ TEST_F(LockApiTest, ClosingALockedTargetDoesNotUnlockIt)
     EXPECT_TRUE(log.has("m_plugin is NULL!\n"));
 }
 
-TEST_F(LockApiTest, DestroyingTheSessionReleasesTheLockFirst)
-{
-    const unsigned h = openTarget();
-    unsigned status = 0;
-    ASSERT_EQ(JEX_SUCCESS, JexJtag_target_lock(h, 1, &status));
-    clearRecord();
-    ASSERT_EQ(JEX_SUCCESS, JexJtag_session_destroy(h));
-    m_handle = kNoSession;
-    const std::vector<std::string> got = calls();
-    ASSERT_GE(got.size(), 3u);
-    EXPECT_EQ("unlockTarget", got[0]);
-    EXPECT_EQ("closeTarget", got[1]);
-    EXPECT_EQ(0u, got[2].find("JexPlugin_destroy"));
-}
-
-TEST_F(LockApiTest, NestedLockObjectsTakeAndReleaseTheLockOnce)
-{
-    const unsigned h = openTarget();
-    {
-        JexRT::JexJtagTargetLock outer(h, JexRT::JexJtagTargetLock::ONE_MINUTE_MAX_WAIT);
-        EXPECT_TRUE(outer.holdsLock());
-        {
-            JexRT::JexJtagTargetLock inner(h, 10);
-            EXPECT_FALSE(inner.holdsLock());
-        }
-        unsigned status = 0;
-        EXPECT_EQ(JEX_SUCCESS, JexJtag_target_getLockStatus(h, &status));
-        EXPECT_EQ(unsigned{JEXJTAG_LOCKED_ME}, status); // the inner one left it held
-    }
-    EXPECT_EQ((std::vector<std::string>{"lockTarget msWait=60000", "unlockTarget"}), calls());
-    unsigned status = 0;
-    EXPECT_EQ(JEX_SUCCESS, JexJtag_target_getLockStatus(h, &status));
-    EXPECT_EQ(unsigned{JEXJTAG_UNLOCKED}, status);
-}
-
 TEST_F(LockApiTest, RefusedLocksLeaveTheTargetUnlockedAndNoTargetThrows)
 {
     const unsigned h = createSession();
