@@ -15,6 +15,7 @@
 
 namespace JexRT {
 
+class BoundaryStore;
 class InternalSessionMessageListener;
 class PluginManager;
 class Target;
@@ -84,6 +85,8 @@ public:
                                          std::string& bypass);
 
     const std::vector<std::string>& getArguments() const { return m_args; }
+    // The session's BSDL parts and BSDL library (created on first use).
+    BoundaryStore& boundary();
 
     // The one plug-in manager of the process: created by the first
     // session's init, deleted by the registry after the last session
@@ -98,6 +101,7 @@ private:
     std::string m_pluginSearchPath;
     std::unique_ptr<InternalSessionMessageListener> m_messageListener;
     DeviceDB m_deviceDB;
+    std::unique_ptr<BoundaryStore> m_boundary;
 };
 
 } // namespace JexRT
