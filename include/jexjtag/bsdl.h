@@ -136,7 +136,9 @@ JEXJTAG_API uint32_t JexJtag_bsdl_getRegisterAccess(unsigned handle, unsigned pa
  * directory that cannot be read fails. */
 JEXJTAG_API uint32_t JexJtag_bsdl_addDirectory(unsigned handle, const char* directory, unsigned* added);
 /* Looks an IDCODE ('0'/'1' text, most significant bit first) up in the
- * session's BSDL library: the first file added whose pattern matches.  A
+ * session's BSDL library: of the files whose pattern matches, the one that
+ * fixes the most bits (the first added among equals), so a file with an
+ * all-don't-care IDCODE names only what no other file matches.  A
  * code nothing matches succeeds with empty texts and *irLength 0.  Any
  * output may be null. */
 JEXJTAG_API uint32_t JexJtag_bsdl_findByIdcode(unsigned handle, const char* idcode, char* entity,

@@ -65,9 +65,19 @@ bool BsdlLibrary::addDirectory(const std::string& directory, unsigned& added, co
 
 const BsdlLibrary::Entry* BsdlLibrary::find(uint32_t idcode) const
 {
-    for (const Entry& entry : m_entries)
-        if ((idcode & entry.mask) == entry.value) return &entry;
-    return nullptr;
+    // The most specific pattern wins, so a file whose IDCODE was edited to
+    // all don't-care bits only names what nothing else matches.
+    const Entry* best = nullptr;
+    int bestBits = -1;
+    for (const Entry& entry : m_entries) {
+        if ((idcode & entry.mask) != entry.value) continue;
+        const int bits = __builtin_popcount(entry.mask);
+        if (bits > bestBits) {
+            best = &entry;
+            bestBits = bits;
+        }
+    }
+    return best;
 }
 
 } // namespace JexRT

@@ -27,7 +27,8 @@ public:
     // name order; false when the directory cannot be read.  `added` gets
     // the number of files indexed.
     bool addDirectory(const std::string& directory, unsigned& added, const SkipReport& skipped);
-    // The first entry whose pattern matches the code; null when none.
+    // The matching entry that fixes the most bits (the first added of
+    // those); null when none matches.
     const Entry* find(uint32_t idcode) const;
     size_t size() const { return m_entries.size(); }
 

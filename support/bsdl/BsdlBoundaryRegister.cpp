@@ -151,8 +151,8 @@ void BsdlBoundaryRegister::parse(const BsdlStringValue& value, unsigned length, 
         const bool self = &control == &cell && (cell.function == Function::Output2 || cell.function == Function::Bidir);
         if (!isControl(control.function) && !self)
             s.failAt(offsets[cell.number], which + " names control cell " + std::to_string(cell.controlCell) +
-                                               ", which is a " + functionName(control.function) +
-                                               " cell, not a control cell");
+                                               ", whose function is " + functionName(control.function) +
+                                               ", not control");
     }
 }
 
