@@ -13,7 +13,13 @@
  * Pin access works on one device of the open target's chain with every
  * other device in BYPASS (the plug-in pads device shifts for them, whatever
  * their IR lengths).  It first sets the device's IR length to the part's.
- * Boundary-register bits go in the ABI's order: cell 0 (nearest TDO) first.
+ * A device that JexJtag_bsdl_extest, _highz or _clamp left in that mode is
+ * held there: later pin access on other devices loads its instruction again
+ * (and, under EXTEST, its boundary register with the same values), so a pin
+ * one part drives can be sampled on another.  JexJtag_bsdl_sample on the
+ * held device itself releases it.  Holding needs the IR lengths of every
+ * device of the chain.  Boundary-register bits go in the ABI's order: cell
+ * 0 (nearest TDO) first.
  *
  * Every function returns JEX_SUCCESS or JEX_FAILURE; an unknown session
  * handle or part, or a null pointer where one is required, fails.

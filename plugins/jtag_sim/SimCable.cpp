@@ -67,7 +67,7 @@ bool SimCable::requireOpen()
 void SimCable::buildChain()
 {
     stopRecording();
-    m_chain = std::make_unique<SimChain>(m_options.chain);
+    m_chain = std::make_unique<SimChain>(m_options.chain, &m_options.board);
     m_engine = std::make_unique<JtagEngine>(*m_chain);
 }
 

@@ -86,7 +86,7 @@ unsigned withPins(unsigned handle, unsigned deviceIndex, unsigned part, Step&& s
     Target* target = findTarget(handle);
     const BsdlPart* bsdl = findPart(handle, part);
     if (!session || !target || !bsdl) return JEX_FAILURE;
-    PinAccess access(*target, handle, deviceIndex, *bsdl);
+    PinAccess access(*target, handle, deviceIndex, *bsdl, session->boundary().held());
     const std::string error = step(access, *bsdl);
     if (error.empty()) return JEX_SUCCESS;
     session->sendMessage(JEX_MSG_ERROR, error + "\n");

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: MIT
 #include "boundary/PinAccess.hpp"
 
+#include <iterator>
 #include <map>
 
 #include "target/Target.hpp"
@@ -20,8 +21,9 @@ std::vector<unsigned char> pack(const std::vector<uint8_t>& bits)
 
 } // namespace
 
-PinAccess::PinAccess(Target& target, unsigned handle, unsigned deviceIndex, const BsdlPart& part)
-    : m_target(target), m_handle(handle), m_device(deviceIndex), m_part(part)
+PinAccess::PinAccess(Target& target, unsigned handle, unsigned deviceIndex, const BsdlPart& part,
+                     HeldDevices& held)
+    : m_target(target), m_handle(handle), m_device(deviceIndex), m_part(part), m_held(held)
 {
 }
 
@@ -29,8 +31,10 @@ std::string PinAccess::prepare()
 {
     unsigned count = 0;
     if (JEX_FAILED(m_target.getDeviceCount(&count))) return "the device count cannot be read";
+    m_count = count;
     if (m_device >= count)
         return "device " + std::to_string(m_device) + " is outside the chain of " + std::to_string(count) + " devices";
+    for (auto it = m_held.begin(); it != m_held.end();) it = it->first >= count ? m_held.erase(it) : std::next(it);
     if (m_part.entity().boundary.empty()) return "the BSDL file describes no boundary register";
     unsigned irLength = 0;
     const unsigned wanted = m_part.entity().instructionLength;
@@ -42,34 +46,98 @@ std::string PinAccess::prepare()
     return {};
 }
 
-std::string PinAccess::loadInstruction(const char* name, const char* alternative)
+std::vector<uint8_t> PinAccess::opcodeBits(const char* name, const char* alternative) const
 {
     std::string opcode = m_part.opcode(name);
     if (opcode.empty() && alternative) opcode = m_part.opcode(alternative);
-    if (opcode.empty())
-        return "the BSDL file of " + m_part.entity().name + " declares no " + name + " instruction";
     // Opcodes are written most significant bit first; bit 0 goes first.
     std::vector<uint8_t> bits(opcode.size());
     for (size_t i = 0; i < opcode.size(); ++i) bits[i] = opcode[opcode.size() - 1 - i] == '1';
-    const std::vector<unsigned char> tdi = pack(bits);
+    return bits;
+}
+
+std::string PinAccess::loadInstruction(const char* name, const char* alternative)
+{
+    m_ir = opcodeBits(name, alternative);
+    if (m_ir.empty()) return "the BSDL file of " + m_part.entity().name + " declares no " + name + " instruction";
     JexJtagCallContext context {m_handle, 0, nullptr};
-    if (JEX_FAILED(m_target.shiftDeviceIR(m_device, tdi.data(), nullptr, static_cast<unsigned>(bits.size()), nullptr,
-                                          nullptr, JEXJTAG_SHIFT_WRITE, JEXJTAG_RUN_TEST_IDLE, &context)))
+    const bool others = m_held.size() > (m_held.count(m_device) ? 1u : 0u);
+    if (!others) {
+        const std::vector<unsigned char> tdi = pack(m_ir);
+        if (JEX_FAILED(m_target.shiftDeviceIR(m_device, tdi.data(), nullptr, static_cast<unsigned>(m_ir.size()),
+                                              nullptr, nullptr, JEXJTAG_SHIFT_WRITE, JEXJTAG_RUN_TEST_IDLE, &context)))
+            return std::string("loading ") + name + " into device " + std::to_string(m_device) + " failed";
+        return {};
+    }
+    // The whole chain's IR, device 0 (nearest TDO) first: held devices get
+    // their instruction again, the others BYPASS.
+    std::vector<uint8_t> chain;
+    for (unsigned k = 0; k < m_count; ++k) {
+        const auto held = m_held.find(k);
+        if (k == m_device) {
+            chain.insert(chain.end(), m_ir.begin(), m_ir.end());
+        } else if (held != m_held.end()) {
+            chain.insert(chain.end(), held->second.instruction.begin(), held->second.instruction.end());
+        } else {
+            unsigned length = 0;
+            if (JEX_FAILED(m_target.getIRLength(k, &length)) || length == 0)
+                return "the IR length of device " + std::to_string(k) + " is not known";
+            chain.insert(chain.end(), length, 1);
+        }
+    }
+    const std::vector<unsigned char> tdi = pack(chain);
+    if (JEX_FAILED(m_target.shiftChainIR(tdi.data(), nullptr, static_cast<unsigned>(chain.size()), nullptr, nullptr,
+                                         JEXJTAG_SHIFT_WRITE, JEXJTAG_RUN_TEST_IDLE, &context)))
         return std::string("loading ") + name + " into device " + std::to_string(m_device) + " failed";
     return {};
 }
 
 std::string PinAccess::shiftRegister(const std::vector<uint8_t>& in, std::vector<uint8_t>& out)
 {
-    const std::vector<unsigned char> tdi = pack(in);
-    std::vector<unsigned char> tdo(tdi.size(), 0);
     JexJtagCallContext context {m_handle, 0, nullptr};
-    if (JEX_FAILED(m_target.shiftDeviceDR(m_device, tdi.data(), tdo.data(), static_cast<unsigned>(in.size()), nullptr,
-                                          nullptr, JEXJTAG_SHIFT_READWRITE, JEXJTAG_RUN_TEST_IDLE, &context)))
+    bool others = false;
+    for (const auto& [index, held] : m_held) others = others || (index != m_device && !held.boundary.empty());
+    if (!others) {
+        const std::vector<unsigned char> tdi = pack(in);
+        std::vector<unsigned char> tdo(tdi.size(), 0);
+        if (JEX_FAILED(m_target.shiftDeviceDR(m_device, tdi.data(), tdo.data(), static_cast<unsigned>(in.size()),
+                                              nullptr, nullptr, JEXJTAG_SHIFT_READWRITE, JEXJTAG_RUN_TEST_IDLE,
+                                              &context)))
+            return "shifting the boundary register of device " + std::to_string(m_device) + " failed";
+        out.resize(in.size());
+        for (size_t i = 0; i < in.size(); ++i) out[i] = (tdo[i / 8] >> (i % 8)) & 1u;
+        return {};
+    }
+    // The whole chain's DR: a held device under EXTEST gets its boundary
+    // values again, the others their one BYPASS bit.
+    std::vector<uint8_t> chain;
+    size_t offset = 0;
+    for (unsigned k = 0; k < m_count; ++k) {
+        const auto held = m_held.find(k);
+        if (k == m_device) {
+            offset = chain.size();
+            chain.insert(chain.end(), in.begin(), in.end());
+        } else if (held != m_held.end() && !held->second.boundary.empty()) {
+            chain.insert(chain.end(), held->second.boundary.begin(), held->second.boundary.end());
+        } else {
+            chain.push_back(0);
+        }
+    }
+    const std::vector<unsigned char> tdi = pack(chain);
+    std::vector<unsigned char> tdo(tdi.size(), 0);
+    if (JEX_FAILED(m_target.shiftChainDR(tdi.data(), tdo.data(), static_cast<unsigned>(chain.size()), nullptr, nullptr,
+                                         JEXJTAG_SHIFT_READWRITE, JEXJTAG_RUN_TEST_IDLE, &context)))
         return "shifting the boundary register of device " + std::to_string(m_device) + " failed";
     out.resize(in.size());
-    for (size_t i = 0; i < in.size(); ++i) out[i] = (tdo[i / 8] >> (i % 8)) & 1u;
+    for (size_t i = 0; i < in.size(); ++i) out[i] = (tdo[(offset + i) / 8] >> ((offset + i) % 8)) & 1u;
     return {};
+}
+
+void PinAccess::hold(std::vector<uint8_t> boundary)
+{
+    Held& held = m_held[m_device];
+    held.instruction = m_ir;
+    held.boundary = std::move(boundary);
 }
 
 void PinAccess::decode(const std::vector<uint8_t>& cells, std::vector<int8_t>& levels) const
@@ -87,6 +155,7 @@ std::string PinAccess::sample(std::vector<int8_t>& levels, std::vector<uint8_t>&
     if (error.empty()) error = loadInstruction("SAMPLE", "PRELOAD");
     if (error.empty()) error = shiftRegister(m_part.safeBits(), cells);
     if (error.empty()) decode(cells, levels);
+    m_held.erase(m_device); // SAMPLE leaves the pins to the device's own logic
     return error;
 }
 
@@ -130,7 +199,10 @@ std::string PinAccess::extest(const std::vector<std::pair<size_t, char>>& settin
     if (error.empty()) error = loadInstruction("PRELOAD", "SAMPLE");
     if (error.empty()) error = shiftRegister(bits, captured);
     if (error.empty()) error = loadInstruction("EXTEST");
-    if (error.empty()) error = shiftRegister(bits, captured);
+    if (error.empty()) {
+        hold(bits);
+        error = shiftRegister(bits, captured);
+    }
     if (error.empty()) decode(captured, levels);
     return error;
 }
@@ -139,6 +211,7 @@ std::string PinAccess::highz()
 {
     std::string error = prepare();
     if (error.empty()) error = loadInstruction("HIGHZ");
+    if (error.empty()) hold({});
     return error;
 }
 
@@ -149,6 +222,7 @@ std::string PinAccess::clamp()
     if (error.empty()) error = loadInstruction("PRELOAD", "SAMPLE");
     if (error.empty()) error = shiftRegister(m_part.safeBits(), captured);
     if (error.empty()) error = loadInstruction("CLAMP");
+    if (error.empty()) hold({});
     return error;
 }
 
