@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: MIT
 #include "SimBoard.hpp"
 
-#include "PluginArgs.hpp"
+#include "jexjtag/cable/PluginArgs.hpp"
 #include "SimPart.hpp"
 
 namespace jexsim {

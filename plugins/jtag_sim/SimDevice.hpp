@@ -28,7 +28,7 @@
 #include <vector>
 
 #include "DeviceSpec.hpp"
-#include "TapController.hpp"
+#include "jexjtag/cable/TapController.hpp"
 
 namespace jexsim {
 

@@ -20,7 +20,7 @@
 
 #include "DeviceSpec.hpp"
 #include "SimBoard.hpp"
-#include "PluginArgs.hpp"
+#include "jexjtag/cable/PluginArgs.hpp"
 
 namespace jexsim {
 
