@@ -11,6 +11,7 @@ namespace jexjtag::cli {
     X(lookup)               \
     X(bsdl)                 \
     X(shift)                \
+    X(pins)                 \
     X(info)                 \
     X(serve)                \
     X(help)
