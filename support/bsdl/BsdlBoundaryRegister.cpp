@@ -23,7 +23,7 @@ constexpr FunctionName kFunctions[] = {
 
 constexpr const char* kResults[] = {"Z", "WEAK0", "WEAK1", "PULL0", "PULL1", "KEEPER"};
 
-char bitValue(const std::string& text)
+char bitValue(std::string_view text)
 {
     if (text == "0" || text == "1") return text[0];
     if (text == "X" || text == "x") return 'X';
@@ -47,10 +47,12 @@ void BsdlBoundaryRegister::parse(const BsdlStringValue& value, unsigned length, 
     if (s.atEnd()) s.fail("no cell is described");
     for (;;) {
         const size_t start = (s.skipSpace(), s.position());
+        s.setContext(std::string());
         const unsigned long number = s.number("a cell number");
         if (number >= length)
             s.failAt(start, "cell " + std::to_string(number) + " is outside the register of BOUNDARY_LENGTH " +
                                 std::to_string(length));
+        s.setContext("cell", number);
         Cell& stored = m_cells[number];
         // A second description of a number is a merged cell: one input (or
         // clock, observe_only) and one control or output function.
@@ -63,22 +65,23 @@ void BsdlBoundaryRegister::parse(const BsdlStringValue& value, unsigned length, 
         cell.line = s.lineAt(start);
         cell.described = true;
         if (!again) offsets[number] = start;
-        const std::string where = "in cell " + std::to_string(number);
-        s.expect('(', "after cell number " + std::to_string(number));
-        cell.cellType = s.identifier("the cell type " + where);
-        s.expect(',', "after the cell type " + where);
+        s.expect('(', "after the cell number");
+        cell.cellType = s.identifier("the cell type");
+        s.expect(',', "after the cell type");
         if (s.accept('*')) {
             cell.port = "*";
         } else {
-            cell.port = s.identifier("a port name or '*' " + where);
+            cell.port = s.identifier("a port name or '*'");
             if (s.accept('(')) {
-                cell.port += "(" + std::to_string(s.number("a port index " + where)) + ")";
-                s.expect(')', "after the port index " + where);
+                cell.port += '(';
+                cell.port += std::to_string(s.number("a port index"));
+                cell.port += ')';
+                s.expect(')', "after the port index");
             }
         }
-        s.expect(',', "after the port " + where);
+        s.expect(',', "after the port");
         const size_t functionAt = (s.skipSpace(), s.position());
-        const std::string function = s.identifier("a cell function " + where);
+        const std::string_view function = s.identifier("a cell function");
         bool known = false;
         for (const FunctionName& f : kFunctions)
             if (equalsIgnoreCase(function, f.name)) {
@@ -89,28 +92,28 @@ void BsdlBoundaryRegister::parse(const BsdlStringValue& value, unsigned length, 
             s.failAt(functionAt, "cell " + std::to_string(number) + " has the unknown function " + quoted(function) +
                                      " (input, clock, output2, output3, control, controlr, internal, bidir, "
                                      "observe_only)");
-        s.expect(',', "after the function " + where);
-        const std::string safe = s.word("a safe value " + where, ",()");
+        s.expect(',', "after the function");
+        const std::string_view safe = s.word("a safe value", ",()");
         cell.safe = bitValue(safe);
         if (!cell.safe) s.fail("the safe value of cell " + std::to_string(number) + " must be 0, 1 or X, found " + quoted(safe));
         if (s.accept(',')) {
-            const unsigned long control = s.number("a control cell number " + where);
+            const unsigned long control = s.number("a control cell number");
             cell.controlCell = static_cast<int>(control);
-            s.expect(',', "after the control cell " + where);
-            const std::string disable = s.word("a disable value " + where, ",()");
+            s.expect(',', "after the control cell");
+            const std::string_view disable = s.word("a disable value", ",()");
             cell.disableValue = bitValue(disable);
             if (cell.disableValue != '0' && cell.disableValue != '1')
                 s.fail("the disable value of cell " + std::to_string(number) + " must be 0 or 1, found " +
                        quoted(disable));
-            s.expect(',', "after the disable value " + where);
-            const std::string result = s.identifier("a disable result " + where);
+            s.expect(',', "after the disable value");
+            const std::string_view result = s.identifier("a disable result");
             for (const char* r : kResults)
                 if (equalsIgnoreCase(result, r)) cell.disableResult = r;
             if (cell.disableResult.empty())
                 s.fail("the disable result of cell " + std::to_string(number) + " must be Z, WEAK0, WEAK1, PULL0, "
                        "PULL1 or KEEPER, found " + quoted(result));
         }
-        s.expect(')', "at the end of cell " + std::to_string(number));
+        s.expect(')', "at the end of the cell");
         if (again) {
             const auto inputOnly = [](const Cell& c) {
                 return c.port != "*" && captures(c.function) && c.function != Function::Bidir;
@@ -128,6 +131,7 @@ void BsdlBoundaryRegister::parse(const BsdlStringValue& value, unsigned length, 
             }
         }
         if (s.atEnd()) break;
+        s.setContext(std::string());
         s.expect(',', "between cells");
         if (s.atEnd()) {
             diagnostics.warning(s.line(), "BOUNDARY_REGISTER ends with a ','");

@@ -52,15 +52,17 @@ void BsdlPinMap::applyPinMap(const std::string& constantName, const BsdlStringVa
     if (s.atEnd()) return;
     for (;;) {
         const unsigned line = s.line();
-        const std::string portName = s.identifier("a port name");
-        s.expect(':', "after port " + portName);
+        s.setContext(std::string());
+        const std::string portName(s.identifier("a port name"));
+        s.setContext("port " + portName);
+        s.expect(':', "after the port name");
         std::vector<std::string> pins;
         if (s.accept('(')) {
-            do pins.push_back(s.word("a pin of port " + portName, ",():"));
+            do pins.emplace_back(s.word("a pin", ",():"));
             while (s.accept(','));
-            s.expect(')', "after the pins of port " + portName);
+            s.expect(')', "after the pins");
         } else {
-            pins.push_back(s.word("the pin of port " + portName, ",():"));
+            pins.emplace_back(s.word("a pin", ",():"));
         }
 
         const Port* port = nullptr;
@@ -87,6 +89,7 @@ void BsdlPinMap::applyPinMap(const std::string& constantName, const BsdlStringVa
             }
         }
         if (s.atEnd()) return;
+        s.setContext(std::string());
         s.expect(',', "between ports");
         if (s.atEnd()) return; // a trailing ',' is common and harmless
     }
