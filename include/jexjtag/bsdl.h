@@ -1,3 +1,4 @@
+/* SPDX-License-Identifier: MIT */
 /*
  * bsdl.h - boundary scan from BSDL files: a device's full description, a
  * library of BSDL files indexed by IDCODE, and pin access (SAMPLE, EXTEST,

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // SimBoard - what surrounds the simulated parts made from BSDL files: the
 // levels the board holds their pins at, and wires between pins of two

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // SimPart - a simulated device's make-up taken from a BSDL file: IDCODE,
 // IR length and capture, every instruction with its opcodes, and the

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // BoundaryStore - a session's boundary-scan state: the BSDL parts it has
 // opened (numbered from 1), its BSDL library and the devices pin access

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // BsdlLibrary - BSDL files indexed by their IDCODE_REGISTER, X bits as
 // don't-care, for naming the devices of a chain.  Each file is read once,

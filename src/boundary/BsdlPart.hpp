@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // BsdlPart - one device's BSDL description as pin access needs it: the
 // entity as read, the pin table (port elements that have a boundary cell,

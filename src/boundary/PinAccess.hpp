@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // PinAccess - SAMPLE, EXTEST, HIGHZ and CLAMP on one device of a target's
 // chain, described by a BsdlPart.  The device's IR length is set to the

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // BsdlBoundaryRegister - the cells of a BOUNDARY_REGISTER attribute:
 //

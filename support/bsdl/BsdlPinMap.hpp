@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // BsdlPinMap - the device's ports (from the entity's port clause) and the
 // package pins a PIN_MAP_STRING constant gives them:

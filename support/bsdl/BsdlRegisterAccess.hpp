@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // BsdlRegisterAccess - the REGISTER_ACCESS attribute: which data register
 // each instruction selects, for example

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // BsdlTextScanner - walks the text of a string-valued attribute (the
 // literals already joined) for the small grammars inside BSDL strings:

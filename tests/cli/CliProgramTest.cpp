@@ -384,6 +384,11 @@ TEST_F(CliProgramTest, PinsSamplesAndDrivesAPartMadeFromABsdlFile)
     expectFailure(run(input), "EXTEST of device 1 failed");
     expectFailure(run({"pins", "-d", "3", "--bsdl", kPartFile, "--chain", kPartChain}),
                   "device 3 is outside the chain of 3 devices");
+    // The wrong file for the device is worth a warning.
+    r = run({"pins", "-d", "1", "--bsdl", kPartFile, "--chain", kPartChain});
+    EXPECT_EQ("", r.err);
+    r = run({"pins", "-d", "2", "--bsdl", kPartFile, "--chain", kPartChain});
+    EXPECT_TRUE(contains(r.err, "warning: device 2 has IDCODE 00010010001101000101011001111001, which ")) << r.err;
 }
 
 TEST_F(CliProgramTest, ScanNamesUnknownDevicesFromABsdlDirectory)

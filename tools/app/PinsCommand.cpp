@@ -150,6 +150,15 @@ void runPins(const Options& options, MessageSink& sink, std::ostream& out)
         throw CliError("cannot set the IR length of device " + std::to_string(device));
     std::vector<ChainDevice> devices = readChain(handle);
     inferIrLengths(handle, devices, sink);
+    const std::string pattern = summary.idcode;
+    const std::string& bits = devices[device].idcodeBits;
+    bool matches = pattern.size() == bits.size();
+    for (size_t i = 0; matches && i < pattern.size(); ++i)
+        matches = pattern[i] == 'X' || pattern[i] == 'x' || pattern[i] == bits[i];
+    if (!pattern.empty() && !matches)
+        sink.deliver(JEX_MSG_WARNING, ("device " + std::to_string(device) + " has IDCODE " + bits + ", which " +
+                                       file + " (" + summary.entity + ", " + pattern + ") does not describe")
+                                          .c_str());
 
     PinsResult result = pinTable(handle, part, device);
     if (options.flag("highz")) {
