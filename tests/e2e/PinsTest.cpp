@@ -134,3 +134,38 @@ TEST_F(Pins, PinsThatCannotBeDrivenFailBeforeAnythingIsShifted)
     EXPECT_EQ(JEX_FAILURE, JexJtag_target_setOption(m_handle, "wire", "0:IN0-1:IN0"));
     EXPECT_EQ(1, sample(0)["IN0"]);
 }
+
+TEST_F(Pins, AVendorPartWithALongRegisterDrivesAndReadsItsPins)
+{
+    // 104 cells: the register moves through the simulator 64 bits at a time.
+    const std::string vendor = std::string(JEXJTAG_TEST_SOURCE_DIR) + "/tests/bsdl/data/lattice_LCMXO2_256HC_QFN32.bsd";
+    ASSERT_EQ(JEX_SUCCESS, open("bsdl=" + vendor + "," + e2e::kArtix + ",bsdl=" + vendor,
+                                {"pins=0:PL5C=1;0:PT9B=1", "wire=0:PT8C-2:PT8D;2:PT9A-0:PL5D"}));
+    unsigned lattice = 0;
+    ASSERT_EQ(JEX_SUCCESS, JexJtag_bsdl_open(m_handle, vendor.c_str(), &lattice));
+    JexBsdlSummary s;
+    ASSERT_EQ(JEX_SUCCESS, JexJtag_bsdl_getSummary(m_handle, lattice, &s));
+    ASSERT_EQ(104u, s.boundaryLength);
+    const auto levelsOf = [&](unsigned device) {
+        std::vector<signed char> levels(s.pinCount);
+        EXPECT_EQ(JEX_SUCCESS, JexJtag_bsdl_sample(m_handle, device, lattice, levels.data(), s.pinCount, nullptr, 0));
+        std::map<std::string, int> out;
+        for (unsigned i = 0; i < s.pinCount; ++i) {
+            JexBsdlPin pin;
+            JexJtag_bsdl_getPin(m_handle, lattice, i, &pin);
+            out[pin.port] = levels[i];
+        }
+        return out;
+    };
+    Levels before = levelsOf(0);
+    EXPECT_EQ(1, before["PL5C"]);
+    EXPECT_EQ(1, before["PT9B"]);
+    EXPECT_EQ(0, before["PT8C"]);
+
+    const char* pins[] = {"PT8C", "PT9A"};
+    ASSERT_EQ(JEX_SUCCESS, JexJtag_bsdl_extest(m_handle, 0, lattice, 1, pins, "1", nullptr, 0));
+    EXPECT_EQ(1, levelsOf(2)["PT8D"]); // driven by device 0, held in EXTEST
+    ASSERT_EQ(JEX_SUCCESS, JexJtag_bsdl_extest(m_handle, 2, lattice, 1, pins + 1, "1", nullptr, 0));
+    EXPECT_EQ(1, levelsOf(0)["PL5D"]); // driven by device 2; SAMPLE releases device 0
+    EXPECT_EQ(0, levelsOf(2)["PT8D"]);
+}

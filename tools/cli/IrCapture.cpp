@@ -77,15 +77,22 @@ IrInference inferUnknownIrLengths(const std::vector<bool>& capture, const std::v
         IrInference split = splitIrCapture(piece, static_cast<unsigned>(last - first + 1));
         if (!split.ok) return split;
         result = split;
+        result.ambiguous = split.ambiguous && first != last; // one device: the segment is its IR
         result.lengths = known;
         for (std::size_t i = first; i <= last; ++i) result.lengths[i] = split.lengths[i - first];
         return result;
     }
     IrInference whole = splitIrCapture(capture, static_cast<unsigned>(n));
     if (!whole.ok) return whole;
+    std::size_t sum = 0;
     for (std::size_t i = 0; i < n; ++i) {
         if (known[i] != 0 && known[i] != whole.lengths[i]) whole.ambiguous = true;
         if (known[i] != 0) whole.lengths[i] = known[i];
+        sum += whole.lengths[i];
+    }
+    if (sum != capture.size()) {
+        result.error = "the known IR lengths do not fit the IR capture";
+        return result;
     }
     return whole;
 }

@@ -28,7 +28,8 @@ IrInference splitIrCapture(const std::vector<bool>& capture, unsigned deviceCoun
 // known: a single run of unknown devices gets exactly the capture bits
 // between its known neighbours (split by the rule above); several runs are
 // placed by splitting the whole capture, which is then ambiguous unless it
-// agrees with every known length.
+// agrees with every known length (and fails when the lengths do not add up).
+// A run of one device is never ambiguous: its bits are its IR.
 IrInference inferUnknownIrLengths(const std::vector<bool>& capture, const std::vector<unsigned>& known);
 
 } // namespace jexjtag::cli
