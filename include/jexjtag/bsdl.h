@@ -69,7 +69,7 @@ JEXJTAG_STATIC_ASSERT(offsetof(JexBsdlSummary, irLength) == 164, "JexBsdlSummary
 typedef struct JexBsdlCell {
     uint32_t number;
     uint32_t function;        /* JexBsdlFunction */
-    int32_t  controlCell;     /* -1 without a disable specification */
+    int32_t  controlCell;     /* -1 without disable fields */
     char     safe;            /* '0', '1' or 'X' */
     char     disableValue;    /* '0' or '1'; 0 without a control cell */
     char     reserved[2];

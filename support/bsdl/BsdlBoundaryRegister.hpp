@@ -30,7 +30,7 @@ public:
         std::string port;          // "IO(0)", "CLK" or "*"
         Function function = Function::Internal;
         char safe = 'X';           // '0', '1' or 'X'
-        int controlCell = -1;      // -1: no disable specification
+        int controlCell = -1;      // -1: no disable fields (ccell, disval, rslt)
         char disableValue = 0;     // '0' or '1' with a control cell, else 0
         std::string disableResult; // "Z", "WEAK0", "WEAK1", "PULL0", "PULL1", "KEEPER"; "" without
         std::string mergedInput;   // a merged cell's input port (a second entry
@@ -58,7 +58,7 @@ public:
 
     // Parses the attribute for a register of `length` cells; throws (through
     // diagnostics) for a malformed entry, a number out of range or given
-    // twice, an unknown function, or a disable specification whose control
+    // twice, an unknown function, or disable fields whose control
     // cell is not a control cell (an output2 or bidir cell may name itself:
     // open drain); a number left undescribed is an error too.
     void parse(const BsdlStringValue& value, unsigned length, BsdlDiagnostics& diagnostics);

@@ -35,7 +35,7 @@ public:
     static constexpr unsigned kMaxNesting = 256;
     static constexpr size_t kMaxStoredValue = 1u << 20; // IDCODE_REGISTER, INSTRUCTION_OPCODE
     static constexpr unsigned kMaxInstructionLength = 4096;
-    static constexpr unsigned kMaxBoundaryLength = 1u << 20;
+    static constexpr unsigned kMaxBoundaryLength = 1u << 17;
 
     BsdlParser(const char* data, size_t size, BsdlDiagnostics& diagnostics);
 

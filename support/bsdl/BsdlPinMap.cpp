@@ -8,8 +8,9 @@ namespace jexbsdl {
 
 namespace {
 
-// Element counts above this are refused ("bit_vector(0 to 2000000000)").
-constexpr long kMaxVectorLength = 1 << 20;
+// Ports beyond this many elements in all get none ("bit_vector(0 to
+// 2000000000)"); real devices have a few thousand.
+constexpr long kMaxElements = 1 << 17;
 
 } // namespace
 
@@ -25,7 +26,7 @@ void BsdlPinMap::addPort(Port port)
     } else {
         const long step = port.left <= port.right ? 1 : -1;
         const long count = (port.left <= port.right ? port.right - port.left : port.left - port.right) + 1;
-        if (count <= kMaxVectorLength)
+        if (count <= kMaxElements - static_cast<long>(m_elements.size()))
             for (long i = port.left;; i += step) {
                 addElement(port.name + "(" + std::to_string(i) + ")");
                 if (i == port.right) break;
