@@ -7,6 +7,7 @@ namespace jexjtag::cli {
 // the entry `nameCommand` that app/<Name>Command.cpp defines.
 #define JEXJTAG_COMMANDS(X) \
     X(targets)              \
+    X(cables)               \
     X(scan)                 \
     X(lookup)               \
     X(bsdl)                 \
