@@ -206,7 +206,7 @@ void runPins(const Options& options, MessageSink& sink, std::ostream& out)
 } // namespace
 
 extern const Command pinsCommand = {
-    "pins", "pins -d N --bsdl FILE", "read (SAMPLE) or drive (EXTEST) a device's pins from its BSDL file",
+    "pins", "pins --bsdl FILE", "read (SAMPLE) or drive (EXTEST) the pins of device --device N",
     {
         {"device", 'd', true, checkNumberValue},
         {"bsdl", 0, true, checkNonEmptyValue},
