@@ -18,5 +18,6 @@
 #include "tap.h"
 #include "db.h"
 #include "bsdl.h"
+#include "svf.h"
 
 #endif /* JEXJTAG_JEXJTAG_H */

@@ -14,6 +14,7 @@ namespace jexjtag::cli {
     X(shift)                \
     X(pins)                 \
     X(info)                 \
+    X(svf)                  \
     X(serve)                \
     X(help)
 
