@@ -10,9 +10,12 @@
 #include <ctime>
 #include <fstream>
 #include <sstream>
+#include <cstdlib>
 #include <string>
+#include <vector>
 
 #include "bsdl/BsdlReader.hpp"
+#include "jexjtag/jexjtag.h"
 #include "hostlayer/Port_MsgDispatcher.hpp"
 #include "hostlayer/Port_MsgMan.hpp"
 
@@ -37,12 +40,12 @@ void silenceWarnings()
     (void)done;
 }
 
-// A device with 5,000 bidirectional pins: 10,000 boundary cells (an input
-// cell and an output/control pair sharing one control cell per 8 pins).
+// A device with 3,333 bidirectional pins: 10,000 boundary cells (per pin an
+// input, an output3 and its control cell, and one internal cell at the end).
 std::string generatedFile()
 {
     static const std::string path = [] {
-        const unsigned pins = 5000, cells = 10000;
+        const unsigned pins = 3333, cells = 10000;
         std::ostringstream s;
         s << "-- Generated: " << cells << " boundary cells\n"
           << "entity BIG_DEVICE is\n"
@@ -67,19 +70,21 @@ std::string generatedFile()
           << "  attribute INSTRUCTION_OPCODE of BIG_DEVICE : entity is\n"
           << "    \"BYPASS (1111111111), EXTEST (0000001111), SAMPLE (0000000101), \" &\n"
           << "    \"PRELOAD (0000000101), IDCODE (0000000110), HIGHZ (0000001011)\";\n"
-          << "  attribute INSTRUCTION_CAPTURE of BIG_DEVICE : entity is \"0101010101\";\n"
+          << "  attribute INSTRUCTION_CAPTURE of BIG_DEVICE : entity is \"0000000001\";\n"
           << "  attribute IDCODE_REGISTER of BIG_DEVICE : entity is\n"
           << "    \"0001\" & \"0010001101000101\" & \"00000110111\" & \"1\";\n"
           << "  attribute BOUNDARY_LENGTH of BIG_DEVICE : entity is " << cells << ";\n"
           << "  attribute BOUNDARY_REGISTER of BIG_DEVICE : entity is\n";
-        for (unsigned c = 0; c < cells; ++c) {
-            const unsigned pin = c / 2;
-            if (c % 2 == 0)
+        for (unsigned c = 0; c + 1 < cells; ++c) {
+            const unsigned pin = c / 3;
+            if (c % 3 == 0)
                 s << "    \"" << c << " (BC_1, IO(" << pin << "), input, X), \" &\n";
+            else if (c % 3 == 1)
+                s << "    \"" << c << " (BC_1, IO(" << pin << "), output3, X, " << c + 1 << ", 0, Z), \" &\n";
             else
-                s << "    \"" << c << " (BC_1, IO(" << pin << "), output3, X, " << c - 1 << ", 0, Z)"
-                  << (c + 1 < cells ? ", \" &\n" : "\";\n");
+                s << "    \"" << c << " (BC_1, *, control, 0), \" &\n";
         }
+        s << "    \"" << cells - 1 << " (BC_1, *, internal, X)\";\n";
         s << "end BIG_DEVICE;\n";
         const std::string file = std::string(JEXJTAG_TEST_BUILD_DIR) + "/bench/bsdl_10000_cells.bsd";
         std::ofstream(file, std::ios::binary) << s.str();
@@ -179,8 +184,66 @@ void BM_ParseBuffer(benchmark::State& state)
     labelFor(state, path, content.size());
 }
 
+void quiet(unsigned, unsigned, const char*) {}
+
+// A BSDL library of all the test files, as "scan --bsdl-dir" reads it once
+// per run: a fresh session, every file read and indexed, one lookup.
+void BM_LibraryDirectory(benchmark::State& state)
+{
+    const std::string dir = std::string(JEXJTAG_TEST_SOURCE_DIR) + "/tests/bsdl/data";
+    unsigned added = 0;
+    for (auto _ : state) {
+        unsigned handle = 0;
+        JexJtag_session_create(quiet, 0, nullptr, &handle);
+        if (JEX_FAILED(JexJtag_bsdl_addDirectory(handle, dir.c_str(), &added))) {
+            state.SkipWithError("directory not read");
+            return;
+        }
+        char entity[128];
+        unsigned ir = 0;
+        JexJtag_bsdl_findByIdcode(handle, "00000010100000100000000011001011", entity, sizeof entity, &ir, nullptr, 0);
+        JexJtag_session_destroy(handle);
+    }
+    state.counters["files"] = added;
+    state.SetLabel("tests/bsdl/data");
+}
+
+// SAMPLE of the generated 10,000-cell part on jtag_sim, between two other
+// devices: IR scan, 10,002-bit DR scan, decoding 3,333 pins.
+void BM_SampleOnJtagSim(benchmark::State& state)
+{
+    setenv("JEXJTAG_PLUGIN_DIR", (std::string(JEXJTAG_TEST_BUILD_DIR) + "/lib/plugins").c_str(), 1);
+    setenv("JEXJTAG_LOCK_DIR", (std::string(JEXJTAG_TEST_BUILD_DIR) + "/bench").c_str(), 1);
+    unsigned handle = 0;
+    JexJtag_session_create(quiet, 0, nullptr, &handle);
+    const std::string chain = "chain=0x4BA00477:4,bsdl=" + generatedFile() + ",0x0362D093:6";
+    const char* argv[] = {chain.c_str(), "port=bsdl-bench"};
+    unsigned part = 0;
+    if (JEX_FAILED(JexJtag_target_open(handle, "jtag_sim", nullptr, 2, argv, nullptr)) ||
+        JEX_FAILED(JexJtag_tap_autodetectChain(handle, 0)) ||
+        JEX_FAILED(JexJtag_bsdl_open(handle, generatedFile().c_str(), &part))) {
+        state.SkipWithError("jtag_sim with the generated part cannot be opened");
+        JexJtag_session_destroy(handle);
+        return;
+    }
+    std::vector<signed char> levels(4000);
+    std::vector<unsigned char> cells(10000 / 8 + 1);
+    for (auto _ : state) {
+        if (JEX_FAILED(JexJtag_bsdl_sample(handle, 1, part, levels.data(), static_cast<unsigned>(levels.size()),
+                                           cells.data(), static_cast<unsigned>(cells.size())))) {
+            state.SkipWithError("sample failed");
+            break;
+        }
+    }
+    state.counters["cells"] = 10000;
+    JexJtag_target_close(handle);
+    JexJtag_session_destroy(handle);
+}
+
 } // namespace
 
+BENCHMARK(BM_LibraryDirectory)->Unit(benchmark::kMillisecond);
+BENCHMARK(BM_SampleOnJtagSim)->Unit(benchmark::kMicrosecond);
 BENCHMARK(BM_ReadFileOnly)->Arg(0)->Arg(1)->Unit(benchmark::kMicrosecond);
 BENCHMARK(BM_ParseFile)->Arg(0)->Arg(1)->Unit(benchmark::kMicrosecond);
 BENCHMARK(BM_ParseBuffer)->Arg(0)->Arg(1)->Unit(benchmark::kMicrosecond);

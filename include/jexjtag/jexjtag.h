@@ -17,6 +17,7 @@
 #include "target.h"
 #include "tap.h"
 #include "db.h"
+#include "bsdl.h"
 #include "svf.h"
 
 #endif /* JEXJTAG_JEXJTAG_H */

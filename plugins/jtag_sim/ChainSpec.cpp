@@ -4,6 +4,7 @@
 #include <cstdio>
 
 #include "jexjtag/cable/PluginArgs.hpp"
+#include "SimPart.hpp"
 
 namespace jexsim {
 
@@ -60,6 +61,20 @@ bool ChainSpec::parseNumber(const std::string& text, uint64_t& value)
     return parseDigits(text, 10, value);
 }
 
+bool ChainSpec::fromBsdl(const std::string& path, DeviceSpec& d, std::string& error)
+{
+    std::shared_ptr<const SimPart> part = SimPart::load(path, error);
+    if (!part) return false;
+    d.part = part;
+    d.hasIdcode = part->hasIdcode();
+    d.idcode = part->idcode();
+    d.irLength = part->irLength();
+    d.idcodeOpcode = part->idcodeOpcode();
+    d.userOpcode = ~uint64_t{0}; // no user register
+    d.irCapture = part->irCapture();
+    return true;
+}
+
 std::string ChainSpec::check(const DeviceSpec& d)
 {
     if (d.irLength < DeviceSpec::kMinIrLength || d.irLength > DeviceSpec::kMaxIrLength)
@@ -92,6 +107,15 @@ bool ChainSpec::parse(const std::string& text, std::vector<DeviceSpec>& devices,
     }
     for (std::size_t i = 0; i < entries.size(); ++i) {
         const std::string where = "device " + std::to_string(i) + " (\"" + entries[i] + "\"): ";
+        if (PluginArgs::toLower(entries[i]).rfind("bsdl=", 0) == 0) {
+            DeviceSpec d;
+            if (!fromBsdl(PluginArgs::trim(entries[i].substr(5)), d, error)) {
+                error = where + error;
+                return false;
+            }
+            result.push_back(d);
+            continue;
+        }
         const std::vector<std::string> fields = split(entries[i], ':');
         if (fields.size() < 2) {
             error = where + "expected IDCODE:IRLENGTH";
@@ -149,6 +173,10 @@ std::string ChainSpec::format(const std::vector<DeviceSpec>& devices)
     std::string text;
     for (const DeviceSpec& d : devices) {
         if (!text.empty()) text += ',';
+        if (d.part) {
+            text += "bsdl=" + d.part->path();
+            continue;
+        }
         if (d.hasIdcode) {
             char id[16];
             std::snprintf(id, sizeof id, "0x%08X", d.idcode);

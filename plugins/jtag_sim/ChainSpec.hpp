@@ -4,6 +4,7 @@
 //
 //   chain   := "" | device ("," device)*          device 0 first (nearest TDO)
 //   device  := id ":" irlen (":" key "=" value)*
+//            | "bsdl=" PATH                      a part made from a BSDL file
 //   id      := hex IDCODE, with or without 0x ("0x4BA00477")
 //            | "none" | "bypass"                 a device without IDCODE
 //   irlen   := decimal, 2..64
@@ -34,6 +35,9 @@ public:
     static bool parse(const std::string& text, std::vector<DeviceSpec>& devices, std::string& error);
     // The text form; options equal to their defaults are left out.
     static std::string format(const std::vector<DeviceSpec>& devices);
+    // A device made from the BSDL file at path (SimPart); false with
+    // `error` set when the file cannot be used.
+    static bool fromBsdl(const std::string& path, DeviceSpec& device, std::string& error);
     // Checks one device; "" when it is sound, else the reason.
     static std::string check(const DeviceSpec& device);
     // Reads an unsigned number: 0x hex, 0b binary or decimal.

@@ -3,8 +3,12 @@
 // believes about it.
 
 #include <cstdint>
+#include <memory>
+#include <string>
 
 namespace jexsim {
+
+class SimPart;
 
 struct DeviceSpec {
     static constexpr uint32_t kMinIrLength = 2;  // IEEE 1149.1: the capture needs two bits
@@ -18,6 +22,9 @@ struct DeviceSpec {
     uint64_t userOpcode = 2;     // selects the scratch user register
     uint32_t userBits = 32;      // length of the user register, 1..64
     uint64_t irCapture = 1;      // value loaded in Capture-IR; low bits binary 01
+    // A device made from a BSDL file: its instructions and boundary register
+    // (the fields above then come from the file; the user register is absent).
+    std::shared_ptr<const SimPart> part;
 
     uint64_t bypassOpcode() const { return irLength >= 64 ? ~uint64_t{0} : (uint64_t{1} << irLength) - 1; }
 };

@@ -31,7 +31,7 @@ SimCable::~SimCable()
 void SimCable::buildChain()
 {
     stopRecording();
-    m_chain = std::make_unique<SimChain>(m_options.chain);
+    m_chain = std::make_unique<SimChain>(m_options.chain, &m_options.board);
     attachTransport(*m_chain);
 }
 

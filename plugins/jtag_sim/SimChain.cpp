@@ -4,10 +4,72 @@
 
 namespace jexsim {
 
-SimChain::SimChain(const std::vector<DeviceSpec>& devices)
+SimChain::SimChain(const std::vector<DeviceSpec>& devices, const SimBoard* board) : m_board(board)
 {
     m_devices.reserve(devices.size());
     for (const DeviceSpec& device : devices) m_devices.emplace_back(device);
+    for (std::size_t k = 0; k < m_devices.size(); ++k) m_devices[k].attach(this, k);
+}
+
+void SimChain::resolveBoard() const
+{
+    const uint64_t version = m_board ? m_board->version : 0;
+    if (version == m_boardVersion) return;
+    m_boardVersion = version;
+    m_netOf.clear();
+    m_nets.clear();
+    m_levels.clear();
+    if (!m_board) return;
+    std::vector<DeviceSpec> specs;
+    for (const SimDevice& d : m_devices) specs.push_back(d.description());
+    for (const SimBoard::Setting& s : m_board->levels) {
+        const int pin = SimBoard::resolve(s.pin, specs);
+        if (pin >= 0) m_levels[key(s.pin.device, pin)] = s.level;
+    }
+    for (const SimBoard::Wire& w : m_board->wires) {
+        const int a = SimBoard::resolve(w.a, specs);
+        const int b = SimBoard::resolve(w.b, specs);
+        if (a < 0 || b < 0) continue;
+        const uint64_t ka = key(w.a.device, a), kb = key(w.b.device, b);
+        auto ia = m_netOf.find(ka), ib = m_netOf.find(kb);
+        if (ia == m_netOf.end() && ib == m_netOf.end()) {
+            m_netOf[ka] = m_netOf[kb] = m_nets.size();
+            m_nets.push_back({{w.a.device, a}, {w.b.device, b}});
+        } else if (ib == m_netOf.end()) {
+            m_netOf[kb] = ia->second;
+            m_nets[ia->second].emplace_back(w.b.device, b);
+        } else if (ia == m_netOf.end()) {
+            m_netOf[ka] = ib->second;
+            m_nets[ib->second].emplace_back(w.a.device, a);
+        } else if (ia->second != ib->second) { // two nets become one
+            const std::size_t keep = ia->second, gone = ib->second;
+            for (const auto& member : m_nets[gone]) {
+                m_netOf[key(member.first, member.second)] = keep;
+                m_nets[keep].push_back(member);
+            }
+            m_nets[gone].clear();
+        }
+    }
+}
+
+bool SimChain::pinLevel(std::size_t device, int pin) const
+{
+    resolveBoard();
+    bool level = false;
+    if (device < m_devices.size() && m_devices[device].drives(pin, level)) return level;
+    const auto net = m_netOf.find(key(device, pin));
+    if (net == m_netOf.end()) {
+        const auto set = m_levels.find(key(device, pin));
+        return set != m_levels.end() && set->second;
+    }
+    const auto& members = m_nets[net->second];
+    for (const auto& [d, p] : members)
+        if (m_devices[d].drives(p, level)) return level;
+    for (const auto& [d, p] : members) {
+        const auto set = m_levels.find(key(d, p));
+        if (set != m_levels.end()) return set->second;
+    }
+    return false;
 }
 
 bool SimChain::clock(bool tms, bool tdi)

@@ -9,20 +9,33 @@
 // of cycles in a Shift state, which it moves 64 bits at a time through every
 // device unless an observer wants to see each clock.  Pin levels and waits
 // go to the observer; TDO can be read as a pin.
+//
+// It is also the board around parts made from BSDL files: a pin's level is
+// what a part drives on its net, else what the board (SimBoard, read at each
+// capture) sets for the net, else 0.
 
 #include <cstdint>
+#include <unordered_map>
+#include <utility>
 #include <vector>
 
 #include "ChainObserver.hpp"
 #include "DeviceSpec.hpp"
 #include "jexjtag/cable/JtagTransport.hpp"
+#include "SimBoard.hpp"
 #include "SimDevice.hpp"
 
 namespace jexsim {
 
-class SimChain final : public jexcable::JtagTransport {
+class SimChain final : public jexcable::JtagTransport, public PinEnvironment {
 public:
-    explicit SimChain(const std::vector<DeviceSpec>& devices);
+    // `board` (may be null; not owned) must outlive the chain.
+    explicit SimChain(const std::vector<DeviceSpec>& devices, const SimBoard* board = nullptr);
+    SimChain(const SimChain&) = delete;
+    SimChain& operator=(const SimChain&) = delete;
+
+    // The level of a part's pin now (see above).
+    bool pinLevel(std::size_t device, int pin) const override;
 
     std::size_t size() const { return m_devices.size(); }
     const SimDevice& device(std::size_t index) const { return m_devices[index]; }
@@ -52,12 +65,20 @@ public:
 
 private:
     bool inShiftState() const;
+    void resolveBoard() const;
+    static uint64_t key(std::size_t device, int pin) { return (uint64_t{device} << 32) | static_cast<uint32_t>(pin); }
 
     std::vector<SimDevice> m_devices;
     ChainObserver* m_observer = nullptr;
     uint64_t m_cycles = 0;
     bool m_lastTms = true;
     bool m_lastTdi = true;
+    const SimBoard* m_board = nullptr;
+    // The board resolved to pin indexes, rebuilt when its version changes.
+    mutable uint64_t m_boardVersion = ~uint64_t{0};
+    mutable std::unordered_map<uint64_t, std::size_t> m_netOf;             // pin -> net
+    mutable std::vector<std::vector<std::pair<std::size_t, int>>> m_nets;  // net -> pins
+    mutable std::unordered_map<uint64_t, bool> m_levels;                    // pin -> level set
 };
 
 } // namespace jexsim

@@ -73,8 +73,18 @@ bool SimOptions::set(const std::string& rawKey, const std::string& value, std::s
             return false;
         }
         newFirmware = flag;
+    } else if (key == "pins") {
+        if (!board.setLevels(value, chain, error)) {
+            error = "pins: " + error;
+            return false;
+        }
+    } else if (key == "wire") {
+        if (!board.setWires(value, chain, error)) {
+            error = "wire: " + error;
+            return false;
+        }
     } else {
-        error = "unknown option \"" + rawKey + "\" (chain, port, frequency, vcd, new_firmware)";
+        error = "unknown option \"" + rawKey + "\" (chain, port, frequency, vcd, new_firmware, pins, wire)";
         return false;
     }
     return true;
@@ -88,22 +98,28 @@ bool SimOptions::get(const std::string& rawKey, std::string& value) const
     else if (key == "frequency") value = std::to_string(frequencyHz);
     else if (key == "vcd") value = vcdPath;
     else if (key == "new_firmware") value = newFirmware ? "1" : "0";
+    else if (key == "pins") value = board.formatLevels();
+    else if (key == "wire") value = board.formatWires();
     else return false;
     return true;
 }
 
 bool SimOptions::apply(const PluginArgs& args, std::string& error, std::vector<std::string>* ignored)
 {
-    static const char* const known[] = {"chain", "port", "frequency", "vcd", "new_firmware"};
+    static const char* const known[] = {"chain", "port", "frequency", "vcd", "new_firmware", "pins", "wire"};
     SimOptions updated = *this;
-    for (const auto& [key, value] : args.entries()) {
-        bool isKnown = false;
-        for (const char* k : known) isKnown = isKnown || PluginArgs::equalsIgnoreCase(key, k);
-        if (!isKnown) {
-            if (ignored) ignored->push_back(key);
-            continue;
+    // Pins and wires name devices of the chain: they go after it.
+    for (const bool boardPass : {false, true}) {
+        for (const auto& [key, value] : args.entries()) {
+            bool isKnown = false;
+            for (const char* k : known) isKnown = isKnown || PluginArgs::equalsIgnoreCase(key, k);
+            if (!isKnown) {
+                if (ignored && !boardPass) ignored->push_back(key);
+                continue;
+            }
+            const bool boardKey = PluginArgs::equalsIgnoreCase(key, "pins") || PluginArgs::equalsIgnoreCase(key, "wire");
+            if (boardKey == boardPass && !updated.set(key, value, error)) return false;
         }
-        if (!updated.set(key, value, error)) return false;
     }
     *this = std::move(updated);
     return true;

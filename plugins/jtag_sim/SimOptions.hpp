@@ -7,6 +7,10 @@
 //   frequency=F       TCK frequency in Hz; suffix k or M allowed (default 10M)
 //   vcd=PATH          record a VCD waveform of everything driven
 //   new_firmware=B    1/true/yes/on: report new firmware (target_flags bit 0)
+//   pins=TEXT         levels the board holds pins of BSDL parts at (SimBoard);
+//                     each set changes the pins it names, "" clears them all
+//   wire=TEXT         wires between pins of BSDL parts (SimBoard), replacing
+//                     the wires before; "" removes them
 // Arguments with other keys (such as "type=jtag_sim", which the library
 // appends) are ignored.
 
@@ -15,6 +19,7 @@
 #include <vector>
 
 #include "DeviceSpec.hpp"
+#include "SimBoard.hpp"
 #include "jexjtag/cable/PluginArgs.hpp"
 
 namespace jexsim {
@@ -29,6 +34,7 @@ public:
     uint64_t frequencyHz = kDefaultFrequency;
     std::string vcdPath;
     bool newFirmware = false;
+    SimBoard board;
 
     // Three real devices, device 0 first:
     //   0x4BA00477 ARM Cortex-M debug port (JTAG-DP), IR 4

@@ -2,6 +2,7 @@
 
 #include <cstdio>
 
+#include "boundary/BoundaryStore.hpp"
 #include "session/InternalSessionMessageListener.hpp"
 #include "session/MessageManager.hpp"
 #include "plugin/PluginManager.hpp"
@@ -22,6 +23,12 @@ Session::Session(unsigned handle, JexMessageCallback msgCallback, const std::vec
 }
 
 Session::~Session() { release(); }
+
+BoundaryStore& Session::boundary()
+{
+    if (!m_boundary) m_boundary = std::make_unique<BoundaryStore>();
+    return *m_boundary;
+}
 
 void Session::init(unsigned handle, JexMessageCallback msgCallback, const std::vector<std::string>& args)
 {

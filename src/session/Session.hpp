@@ -16,6 +16,7 @@
 
 namespace JexRT {
 
+class BoundaryStore;
 class InternalSessionMessageListener;
 class PluginManager;
 class Target;
@@ -96,6 +97,8 @@ public:
                                          std::string& bypass);
 
     const std::vector<std::string>& getArguments() const { return m_args; }
+    // The session's BSDL parts and BSDL library (created on first use).
+    BoundaryStore& boundary();
 
     // Set by the registry when the host destroys the session: its handle
     // reaches nothing any more and its messages are dropped, while a call
@@ -117,6 +120,7 @@ private:
     std::unique_ptr<InternalSessionMessageListener> m_messageListener;
     DeviceDB m_deviceDB;
     std::atomic<bool> m_closing {false};
+    std::unique_ptr<BoundaryStore> m_boundary;
 };
 
 } // namespace JexRT

@@ -128,6 +128,9 @@ void BsdlParser::parseInterfaceList(const char* clause)
     unsigned depth = 1;
     bool elementStart = true;
     bool pinMapElement = false;
+    std::vector<std::string> element; // the tokens of one port declaration
+    unsigned elementLine = 0;
+    const bool ports = !generic;
     while (depth > 0) {
         const BsdlToken& t = m_token;
         if (t.kind == Kind::End)
@@ -138,6 +141,15 @@ void BsdlParser::parseInterfaceList(const char* clause)
             m_diagnostics.error(t.line, std::string("')' expected before ") + quoted(t.text) + ": the " + clause +
                                             " clause begun on line " + std::to_string(startLine) +
                                             " is not closed");
+        if (ports) {
+            if ((depth == 1 && t.isDelimiter(";")) || (depth == 1 && t.isDelimiter(")"))) {
+                addPorts(element, elementLine);
+                element.clear();
+            } else {
+                if (element.empty()) elementLine = t.line;
+                element.emplace_back(t.text);
+            }
+        }
         if (t.isDelimiter("(")) {
             enter(depth);
         } else if (t.isDelimiter(")")) {
@@ -159,6 +171,50 @@ void BsdlParser::parseInterfaceList(const char* clause)
         advance();
     }
     expectDelimiter(";", std::string("the end of the ") + clause + " clause");
+}
+
+// NAME {, NAME} : MODE TYPE [( LEFT to|downto RIGHT )] -- one port declaration.
+// Declarations that do not have this form are left to the clause's own
+// balance check; they only give no ports.
+void BsdlParser::addPorts(const std::vector<std::string>& tokens, unsigned line)
+{
+    size_t colon = 0;
+    while (colon < tokens.size() && tokens[colon] != ":") ++colon;
+    if (colon == 0 || colon + 2 >= tokens.size()) return;
+    BsdlPinMap::Port port;
+    for (char c : tokens[colon + 1]) port.mode += (c >= 'A' && c <= 'Z') ? static_cast<char>(c - 'A' + 'a') : c;
+    port.line = line;
+    const std::string type = upperCase(tokens[colon + 2]);
+    if (type == "BIT_VECTOR") {
+        // "(" LEFT to|downto RIGHT ")"
+        if (tokens.size() < colon + 8 || tokens[colon + 3] != "(") {
+            m_diagnostics.warning(line, "the bit_vector port " + tokens[0] + " has no range; it is left out");
+            return;
+        }
+        const auto number = [&](const std::string& text, long& value) {
+            if (text.empty() || text.size() > 9) return false;
+            value = 0;
+            for (char c : text) {
+                if (!isDigit(c)) return false;
+                value = value * 10 + (c - '0');
+            }
+            return true;
+        };
+        const std::string direction = upperCase(tokens[colon + 5]);
+        if (!number(tokens[colon + 4], port.left) || !number(tokens[colon + 6], port.right) ||
+            (direction != "TO" && direction != "DOWNTO") || (direction == "TO") != (port.left <= port.right)) {
+            m_diagnostics.warning(line, "the range of bit_vector port " + tokens[0] + " is not understood; it is "
+                                        "left out");
+            return;
+        }
+        port.vector = true;
+    }
+    for (size_t i = 0; i < colon; ++i) {
+        if (tokens[i] == ",") continue;
+        BsdlPinMap::Port named = port;
+        named.name = tokens[i];
+        m_entity->pins.addPort(std::move(named));
+    }
 }
 
 // use NAME { . NAME } ;
@@ -215,6 +271,18 @@ void BsdlParser::parseAttribute()
     } else if (equalsIgnoreCase(name, "INSTRUCTION_OPCODE")) {
         seenLine = &m_opcodeLine;
         reader = &BsdlParser::parseInstructionOpcode;
+    } else if (equalsIgnoreCase(name, "INSTRUCTION_CAPTURE")) {
+        seenLine = &m_captureLine;
+        reader = &BsdlParser::parseInstructionCapture;
+    } else if (equalsIgnoreCase(name, "BOUNDARY_LENGTH")) {
+        seenLine = &m_boundaryLengthLine;
+        reader = &BsdlParser::parseBoundaryLength;
+    } else if (equalsIgnoreCase(name, "BOUNDARY_REGISTER")) {
+        seenLine = &m_boundaryLine;
+        reader = &BsdlParser::parseBoundaryRegister;
+    } else if (equalsIgnoreCase(name, "REGISTER_ACCESS")) {
+        seenLine = &m_registerAccessLine;
+        reader = &BsdlParser::parseRegisterAccess;
     }
     if (!reader) {
         skipStatement(line);
@@ -279,6 +347,55 @@ void BsdlParser::parseInstructionOpcode(unsigned)
     m_entity->instructions.parse(value, m_diagnostics);
 }
 
+void BsdlParser::parseInstructionCapture(unsigned line)
+{
+    BsdlStringValue value;
+    readStringExpression(value, "INSTRUCTION_CAPTURE");
+    std::string bits;
+    const std::string& text = value.text();
+    for (size_t i = 0; i < text.size(); ++i) {
+        const char c = text[i];
+        if (c == ' ' || c == '\t') continue;
+        if (c != '0' && c != '1' && c != 'X' && c != 'x')
+            m_diagnostics.error(value.lineAt(i), "INSTRUCTION_CAPTURE may hold only 0, 1 and X, found " +
+                                                     quoted(std::string_view(&text[i], 1)));
+        bits += c;
+    }
+    if (bits.empty()) m_diagnostics.error(line, "INSTRUCTION_CAPTURE is empty");
+    m_entity->instructionCapture = std::move(bits);
+}
+
+void BsdlParser::parseBoundaryLength(unsigned line)
+{
+    if (m_token.kind != Kind::Integer)
+        m_diagnostics.error(m_token.line, "BOUNDARY_LENGTH must be a positive integer, found " + describe(m_token));
+    unsigned long long value = 0;
+    for (char c : m_token.text) {
+        if (c == '_') continue;
+        value = value * 10 + static_cast<unsigned>(c - '0');
+        if (value > kMaxBoundaryLength)
+            m_diagnostics.error(line, "BOUNDARY_LENGTH " + quoted(m_token.text) + " is larger than " +
+                                          std::to_string(kMaxBoundaryLength));
+    }
+    if (value == 0) m_diagnostics.error(line, "BOUNDARY_LENGTH must be at least 1, found 0");
+    m_entity->boundaryLength = static_cast<unsigned>(value);
+    advance();
+    expectDelimiter(";", "the end of BOUNDARY_LENGTH");
+}
+
+void BsdlParser::parseBoundaryRegister(unsigned)
+{
+    // Parsed in finish(): BOUNDARY_LENGTH may come after it.
+    readStringExpression(m_boundaryText, "BOUNDARY_REGISTER");
+}
+
+void BsdlParser::parseRegisterAccess(unsigned)
+{
+    BsdlStringValue value;
+    readStringExpression(value, "REGISTER_ACCESS");
+    m_entity->registerAccess.parse(value, m_diagnostics);
+}
+
 // constant NAME : TYPE := VALUE ;
 // Some vendors use pin-map names that are not VHDL identifiers
 // ("PLQP0144KA-B"); such a name is taken as written, with a warning.
@@ -296,9 +413,14 @@ void BsdlParser::parseConstant()
     if (name.empty()) unexpected("the name of a constant");
     if (pieces > 1) m_diagnostics.warning(line, "constant name " + quoted(name) + " is not a VHDL identifier");
     expectDelimiter(":", "constant " + name);
-    expectIdentifier("the type of constant " + name);
+    const std::string type = expectIdentifier("the type of constant " + name);
     expectDelimiter(":=", "constant " + name);
     m_constants.insert(upperCase(name));
+    if (equalsIgnoreCase(type, "PIN_MAP_STRING") && m_token.kind == Kind::String) {
+        m_pinMaps.emplace_back(name, BsdlStringValue());
+        readStringExpression(m_pinMaps.back().second, "PIN_MAP_STRING " + name);
+        return;
+    }
     skipStatement(line);
 }
 
@@ -323,7 +445,7 @@ void BsdlParser::parseEnd()
 
 void BsdlParser::finish()
 {
-    const BsdlEntity& e = *m_entity;
+    BsdlEntity& e = *m_entity;
     if (!m_lengthLine) m_diagnostics.error(0, "entity " + e.name + " has no INSTRUCTION_LENGTH attribute");
     if (!m_opcodeLine) {
         m_diagnostics.warning(0, "entity " + e.name + " has no INSTRUCTION_OPCODE attribute");
@@ -331,6 +453,24 @@ void BsdlParser::finish()
         if (!e.instructions.find("BYPASS"))
             m_diagnostics.warning(m_opcodeLine, "INSTRUCTION_OPCODE declares no BYPASS instruction");
         e.instructions.checkLengths(e.instructionLength, m_diagnostics);
+    }
+    if (m_boundaryLine) {
+        if (!m_boundaryLengthLine)
+            m_diagnostics.error(m_boundaryLine, "BOUNDARY_REGISTER is given without BOUNDARY_LENGTH");
+        m_entity->boundary.parse(m_boundaryText, e.boundaryLength, m_diagnostics);
+    } else if (m_boundaryLengthLine) {
+        m_diagnostics.warning(m_boundaryLengthLine, "BOUNDARY_LENGTH is given without BOUNDARY_REGISTER");
+    }
+    // The pin map the generic names; without one, the first of the file.
+    const std::pair<std::string, BsdlStringValue>* pinMap = nullptr;
+    for (const auto& candidate : m_pinMaps)
+        if (equalsIgnoreCase(candidate.first, m_physicalPinMap)) pinMap = &candidate;
+    if (!pinMap && !m_pinMaps.empty()) pinMap = &m_pinMaps.front();
+    if (pinMap) m_entity->pins.applyPinMap(pinMap->first, pinMap->second, m_diagnostics);
+    for (const BsdlBoundaryRegister::Cell& cell : e.boundary.cells()) {
+        if (cell.port == "*" || e.pins.find(cell.port) >= 0) continue;
+        m_diagnostics.warning(cell.line, "cell " + std::to_string(cell.number) + " names port " + cell.port +
+                                             ", which the port clause does not declare");
     }
     // Several vendors default the generic to "UNDEFINED" on purpose, so that
     // the user has to choose a package.
@@ -385,6 +525,9 @@ void BsdlParser::readStringExpression(BsdlStringValue& value, const std::string&
             if (m_token.kind != Kind::String) unexpected("a string literal after '&' in " + what);
         } else if (m_token.kind == Kind::String) {
             m_diagnostics.warning(m_token.line, "'&' missing between the string literals of " + what);
+        } else if (beginsStatement(m_token)) {
+            m_diagnostics.error(m_token.line, "';' expected before " + quoted(m_token.text) + " (" + what +
+                                                  " is not ended)");
         } else {
             unexpected("'&' or ';' in " + what);
         }

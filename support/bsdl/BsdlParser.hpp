@@ -1,13 +1,14 @@
 #pragma once
 // BsdlParser - reads the entity of a BSDL text (IEEE 1149.1 Annex B, with the
 // IEEE 1149.6 additions as vendors ship them) and keeps what the library asks
-// for: the entity name, INSTRUCTION_LENGTH, IDCODE_REGISTER and
-// INSTRUCTION_OPCODE.
+// for: the entity name, INSTRUCTION_LENGTH, IDCODE_REGISTER,
+// INSTRUCTION_OPCODE, INSTRUCTION_CAPTURE, BOUNDARY_LENGTH,
+// BOUNDARY_REGISTER, REGISTER_ACCESS, the ports and the pin map.
 //
 // The whole entity is checked for its statement structure: generic and port
 // clauses, use clauses, constants (pin maps), attribute declarations and
 // specifications in any order, and the closing "end".  Attributes that the
-// library does not need (BOUNDARY_REGISTER and the others) are checked for
+// library does not need (TAP_SCAN_CLOCK and the others) are checked for
 // balanced parentheses and their terminating ';' but not stored.  Text before
 // the entity that is not VHDL (board-test programs put a header line there)
 // and text after it are skipped with a warning.
@@ -18,6 +19,8 @@
 #include <cstddef>
 #include <string>
 #include <unordered_set>
+#include <utility>
+#include <vector>
 
 #include "bsdl/BsdlDiagnostics.hpp"
 #include "bsdl/BsdlEntity.hpp"
@@ -32,6 +35,7 @@ public:
     static constexpr unsigned kMaxNesting = 256;
     static constexpr size_t kMaxStoredValue = 1u << 20; // IDCODE_REGISTER, INSTRUCTION_OPCODE
     static constexpr unsigned kMaxInstructionLength = 4096;
+    static constexpr unsigned kMaxBoundaryLength = 1u << 17;
 
     BsdlParser(const char* data, size_t size, BsdlDiagnostics& diagnostics);
 
@@ -54,6 +58,11 @@ private:
     void parseInstructionLength(unsigned line);
     void parseIdcode(unsigned line);
     void parseInstructionOpcode(unsigned line);
+    void parseInstructionCapture(unsigned line);
+    void parseBoundaryLength(unsigned line);
+    void parseBoundaryRegister(unsigned line);
+    void parseRegisterAccess(unsigned line);
+    void addPorts(const std::vector<std::string>& tokens, unsigned line);
 
     // Skips to the ';' that ends the statement begun on `startLine` and
     // consumes it.
@@ -74,6 +83,12 @@ private:
     unsigned m_lengthLine = 0; // line of each stored attribute, 0 while not seen
     unsigned m_idcodeLine = 0;
     unsigned m_opcodeLine = 0;
+    unsigned m_captureLine = 0;
+    unsigned m_boundaryLengthLine = 0;
+    unsigned m_boundaryLine = 0;
+    unsigned m_registerAccessLine = 0;
+    BsdlStringValue m_boundaryText;
+    std::vector<std::pair<std::string, BsdlStringValue>> m_pinMaps; // PIN_MAP_STRING constants
     std::string m_physicalPinMap; // default of the PHYSICAL_PIN_MAP generic
     unsigned m_physicalPinMapLine = 0;
     std::unordered_set<std::string> m_constants; // upper-case names

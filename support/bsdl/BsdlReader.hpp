@@ -1,7 +1,8 @@
 #pragma once
 // BsdlReader - reads a BSDL file (IEEE 1149.1 boundary-scan description) and
 // answers the questions the library asks about the device: its entity name,
-// instruction register length, IDCODE register and instruction opcodes.
+// instruction register length, IDCODE register and instruction opcodes, and
+// (through entity()) its boundary register, pins and register access.
 //
 // A reader is created by CreateBsdlReader and released by removeReader;
 // every text it returns stays valid until then.  A malformed file raises
@@ -44,6 +45,8 @@ public:
     // The first opcode declared for the instruction of that name (any case);
     // "" when the instruction is unknown or the name is null.
     const char* getInstructionOpcode(const char* instructionName) const;
+    // Everything read from the entity: boundary cells, pins, all opcodes.
+    const jexbsdl::BsdlEntity& entity() const { return m_entity; }
     // Releases the reader; it must not be used afterwards.
     void removeReader();
 

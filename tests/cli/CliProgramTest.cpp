@@ -155,8 +155,10 @@ TEST_F(CliProgramTest, ScanJsonOfAChainGivenOnTheCommandLine)
     EXPECT_EQ("0x12345679", stranger["idcode"].str());
     EXPECT_TRUE(stranger["name"].isNull());
     EXPECT_FALSE(stranger["known"].boolValue());
-    // Autodetection takes IR lengths from the database: 0 for a device it does not know.
-    EXPECT_EQ(0u, stranger["ir_length"].uint());
+    // A device the database does not know gets the IR length the chain's IR capture shows.
+    EXPECT_EQ(5u, stranger["ir_length"].uint());
+    EXPECT_EQ("capture", stranger["ir_length_source"].str());
+    EXPECT_EQ("database", artix["ir_length_source"].str());
 
     // Without autodetection the plug-in's own IR lengths stay.
     const minijson::Value plain = runJson({"scan", "--chain", "0x0362D093:6,0x12345679:5", "--no-autodetect"});
@@ -373,4 +375,90 @@ TEST_F(CliProgramTest, AnUnusableLockDirectoryIsNotCalledAHolder)
     const RunResult r = run({"scan", "--lock-wait", "0"});
     expectFailure(r, "cannot lock target 'jtag_sim': jtag_sim: cannot lock port");
     EXPECT_EQ(std::string::npos, r.err.find("locked by another process")) << r.err;
+}
+
+namespace {
+
+const std::string kPartDir = std::string(JEXJTAG_TEST_SOURCE_DIR) + "/tests/e2e/data";
+const std::string kPartFile = kPartDir + "/board_part.bsd";
+// A part made from a BSDL file between a known device and an unknown one.
+const std::string kPartChain = "0x4BA00477:4,bsdl=" + kPartFile + ",0x12345679:5";
+
+} // namespace
+
+TEST_F(CliProgramTest, PinsSamplesAndDrivesAPartMadeFromABsdlFile)
+{
+    const std::vector<std::string> base = {"pins", "-d", "1", "--bsdl", kPartFile, "--chain", kPartChain,
+                                           "--arg", "pins=1:IN0=1;1:10=1"};
+    const minijson::Value doc = runJson(base);
+    EXPECT_EQ(1u, doc["device"].uint());
+    const minijson::Value& in0 = doc["pins"][0];
+    EXPECT_EQ("IN0", in0["port"].str());
+    EXPECT_EQ("5", in0["pin"].str());
+    EXPECT_EQ("input", in0["function"].str());
+    EXPECT_EQ(0u, in0["cell"].uint());
+    EXPECT_EQ(1u, in0["level"].uint());
+    EXPECT_TRUE(doc["pins"][2]["level"].isNull()); // OUT0: no capturing cell
+    EXPECT_EQ("bidir", doc["pins"][4]["function"].str());
+    EXPECT_EQ(1u, doc["pins"][4]["level"].uint()); // IO(1), pin 10
+
+    // Driven under EXTEST, a bidirectional pin reads its own level; a
+    // released one the board's.
+    std::vector<std::string> set = base;
+    set.insert(set.end(), {"--set", "IO(0)=1", "IO(1)=z", "OUT0=0"});
+    const minijson::Value driven = runJson(set);
+    EXPECT_EQ(1u, driven["pins"][3]["level"].uint());
+    EXPECT_EQ(1u, driven["pins"][4]["level"].uint());
+
+    RunResult r = run(base);
+    EXPECT_EQ(0, r.exitCode) << r.err;
+    EXPECT_EQ(0u, r.out.find("device 1 (BOARD_PART), SAMPLE: 5 pins\n"
+                             "  PORT   PIN  FUNCTION  CELL  LEVEL\n"
+                             "  IN0    5    input        0      1\n")) << r.out;
+    std::vector<std::string> watch = base;
+    watch.insert(watch.end(), {"--watch", "--count", "2", "--interval", "1"});
+    r = run(watch);
+    EXPECT_EQ(0, r.exitCode) << r.err;
+    EXPECT_TRUE(contains(r.out, "  IO(1)  10   bidir        7      1\n")) << r.out;
+    std::vector<std::string> highz = base;
+    highz.push_back("--highz");
+    r = run(highz);
+    EXPECT_EQ("device 1 (BOARD_PART): HIGHZ, every output released\n", r.out);
+
+    expectUsageError(run({"pins", "--bsdl", kPartFile}), "'pins' needs --device N");
+    expectUsageError(run({"pins", "-d", "1", "--bsdl", kPartFile, "IO(0)=1"}), "pin settings as operands need --set");
+    expectUsageError(run({"pins", "-d", "1", "--bsdl", kPartFile, "--set", "IO(0)=2"}),
+                     "'IO(0)=2' is not PORT=0, PORT=1 or PORT=z");
+    std::vector<std::string> input = base;
+    input.insert(input.end(), {"--set", "IN0=1"});
+    expectFailure(run(input), "EXTEST of device 1 failed");
+    expectFailure(run({"pins", "-d", "3", "--bsdl", kPartFile, "--chain", kPartChain}),
+                  "device 3 is outside the chain of 3 devices");
+    // The wrong file for the device is worth a warning.
+    r = run({"pins", "-d", "1", "--bsdl", kPartFile, "--chain", kPartChain});
+    EXPECT_EQ("", r.err);
+    r = run({"pins", "-d", "2", "--bsdl", kPartFile, "--chain", kPartChain});
+    EXPECT_TRUE(contains(r.err, "warning: device 2 has IDCODE 00010010001101000101011001111001, which ")) << r.err;
+}
+
+TEST_F(CliProgramTest, ScanNamesUnknownDevicesFromABsdlDirectory)
+{
+    const minijson::Value doc = runJson({"scan", "--chain", kPartChain, "--bsdl-dir", kPartDir});
+    ASSERT_EQ(3u, doc["count"].uint());
+    EXPECT_EQ("database", doc["devices"][0]["ir_length_source"].str());
+    const minijson::Value& part = doc["devices"][1];
+    EXPECT_EQ("BOARD_PART", part["name"].str());
+    EXPECT_EQ(4u, part["ir_length"].uint());
+    EXPECT_EQ("bsdl", part["ir_length_source"].str());
+    EXPECT_EQ(kPartFile, part["bsdl_file"].str());
+    EXPECT_EQ("capture", doc["devices"][2]["ir_length_source"].str());
+    EXPECT_EQ(5u, doc["devices"][2]["ir_length"].uint());
+
+    // Without the directory the part is unknown too; its IR length comes
+    // from the capture.
+    const minijson::Value bare = runJson({"scan", "--chain", kPartChain});
+    EXPECT_TRUE(bare["devices"][1]["name"].isNull());
+    EXPECT_EQ(4u, bare["devices"][1]["ir_length"].uint());
+    EXPECT_EQ("capture", bare["devices"][1]["ir_length_source"].str());
+    expectFailure(run({"scan", "--bsdl-dir", kPartDir + "/none"}), "cannot read the BSDL directory");
 }

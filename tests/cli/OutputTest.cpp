@@ -27,8 +27,8 @@ ScanResult twoDeviceChain()
 {
     ScanResult r;
     r.target = "jtag_sim";
-    r.devices.push_back({0, "01001011101000000000010001110111", 4, "ARM CoreSight JTAG-DP"});
-    r.devices.push_back({1, "00010010001101000101011001111000", 0, ""});
+    r.devices.push_back({0, "01001011101000000000010001110111", 4, "ARM CoreSight JTAG-DP", "database", ""});
+    r.devices.push_back({1, "00010010001101000101011001111000", 0, "", "unknown", ""});
     return r;
 }
 

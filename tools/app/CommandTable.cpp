@@ -12,6 +12,7 @@ namespace jexjtag::cli {
     X(lookup)               \
     X(bsdl)                 \
     X(shift)                \
+    X(pins)                 \
     X(info)                 \
     X(svf)                  \
     X(serve)                \

@@ -15,6 +15,15 @@ std::string displayIdcode(const std::string& bits)
     return value ? idcodeHex(*value) : bits;
 }
 
+// The name, and where a length that is not the device list's comes from.
+std::string deviceText(const ChainDevice& device)
+{
+    if (device.irLengthSource == "bsdl") return device.name + "  (BSDL " + device.bsdlFile + ")";
+    if (device.name.empty())
+        return device.irLengthSource == "capture" ? "(unknown; IR length inferred from the IR capture)" : "(unknown)";
+    return device.name;
+}
+
 } // namespace
 
 namespace {
@@ -37,7 +46,7 @@ void writeScanText(std::ostream& out, const ScanResult& result)
     for (const ChainDevice& device : result.devices)
         table.addRow({std::to_string(device.index), displayIdcode(device.idcodeBits),
                       irLengthKnown(device.irLength) ? std::to_string(device.irLength) : "unknown",
-                      device.name.empty() ? "(unknown)" : device.name});
+                      deviceText(device)});
     table.write(out, "  ");
 }
 
@@ -60,6 +69,8 @@ void writeScanJson(std::ostream& out, const ScanResult& result)
         if (device.name.empty()) json.key("name").null();
         else json.key("name").string(device.name);
         json.key("known").boolean(!device.name.empty());
+        json.key("ir_length_source").string(device.irLengthSource);
+        if (device.irLengthSource == "bsdl") json.key("bsdl_file").string(device.bsdlFile);
         json.endObject();
     }
     json.endArray();

@@ -12,6 +12,10 @@ struct ChainDevice {
     std::string idcodeBits; // as the library gives it: 32 '0'/'1', MSB first
     unsigned irLength = 0;
     std::string name; // empty: not in the device database
+    // Where the IR length comes from: "database", "bsdl" (bsdlFile names the
+    // file), "capture" (inferred from the chain's IR capture) or "unknown".
+    std::string irLengthSource = "unknown";
+    std::string bsdlFile;
 };
 
 struct ScanResult {
