@@ -1,20 +1,25 @@
-// A plug-in written in C against plugin.h alone, dropped into
-// plugins/<company>/<name>/ beside an installed copy of libJexJtag.so, is
-// found without any setting: the plug-in root is the library's directory.
+// A plug-in written in C against plugin.h alone, dropped into the plug-in
+// tree of an installed copy of libJexJtag.so, is found without any setting,
+// and so is the installation's device list: both come from the library's
+// directory, in the plain layout (lib/, lib/plugins, share/jexjtag) and in
+// the Debian multiarch one (lib/<triplet>/, lib/<triplet>/jexjtag/plugins,
+// share/jexjtag).
 
 #include <gtest/gtest.h>
 
 #include <stdlib.h>
 #include <filesystem>
 #include <string>
+#include <vector>
 
 #include "PluginTree.hpp"
+#include "jexjtag/db.h"
 #include "jexjtag/session.h"
 #include "platform/DynamicLibrary.hpp"
 #include "support/TestSupport.hpp"
 
 // Libraries that stay loaded until the process ends (reachable, so no leak).
-jexplatform::DynamicLibrary* g_keptLoaded = nullptr;
+std::vector<jexplatform::DynamicLibrary>* g_keptLoaded = new std::vector<jexplatform::DynamicLibrary>;
 
 namespace {
 
@@ -28,7 +33,21 @@ Fn need(const jexplatform::DynamicLibrary& lib, const char* name)
     return fn;
 }
 
-TEST(InstalledLayout, ACPluginBesideTheLibraryIsListedWithItsDescriptor)
+struct Layout {
+    const char* name;
+    const char* libDir;     // relative to the prefix
+    const char* pluginDir;  // relative to the prefix
+};
+
+class InstalledLayout : public ::testing::TestWithParam<Layout> {};
+
+INSTANTIATE_TEST_SUITE_P(Layouts, InstalledLayout,
+                         ::testing::Values(Layout{"Plain", "lib", "lib/plugins"},
+                                           Layout{"Multiarch", "lib/x86_64-linux-gnu",
+                                                  "lib/x86_64-linux-gnu/jexjtag/plugins"}),
+                         [](const ::testing::TestParamInfo<Layout>& info) { return std::string(info.param.name); });
+
+TEST_P(InstalledLayout, PluginsAndDeviceListAreFoundFromTheLibrarysDirectory)
 {
     testsupport::TempDir prefix;
     testsupport::ScopedEnv home("HOME", prefix.str());
@@ -37,15 +56,14 @@ TEST(InstalledLayout, ACPluginBesideTheLibraryIsListedWithItsDescriptor)
     unsetenv("JEXJTAG_PLUGIN_DIR");
     unsetenv("JEXJTAG_DATA_DIR");
 
-    // <prefix>/lib/libJexJtag.so and <prefix>/lib/plugins/example/loopback/.
-    const fs::path lib = prefix / "lib";
+    const fs::path lib = prefix / GetParam().libDir;
     fs::create_directories(lib);
     fs::copy_file(fs::canonical(fs::path(JEXJTAG_TEST_BUILD_DIR) / "lib" / "libJexJtag.so"), lib / "libJexJtag.so");
     // <prefix>/share/jexjtag/idcode.lst: every session reads the installation's list.
     fs::create_directories(prefix / "share" / "jexjtag");
     fs::copy_file(fs::path(JEXJTAG_TEST_BUILD_DIR) / "share" / "jexjtag" / "idcode.lst",
                   prefix / "share" / "jexjtag" / "idcode.lst");
-    testsupport::PluginTree tree(lib / "plugins");
+    testsupport::PluginTree tree(prefix / GetParam().pluginDir);
     const std::string descriptor = "<?xml version=\"1.0\"?>\n"
                                    "<JexPlugin>\n"
                                    "  <description>Loopback cable written in C</description>\n"
@@ -63,7 +81,8 @@ TEST(InstalledLayout, ACPluginBesideTheLibraryIsListedWithItsDescriptor)
     auto getSize =
         need<decltype(&JexJtag_session_getTargetXMLSizeByIndex)>(jexjtag, "JexJtag_session_getTargetXMLSizeByIndex");
     auto getTarget = need<decltype(&JexJtag_session_getTargetByIndex)>(jexjtag, "JexJtag_session_getTargetByIndex");
-    ASSERT_TRUE(create && destroy && getCount && getSize && getTarget);
+    auto lookup = need<decltype(&JexJtag_db_getIRLengthForIdcode)>(jexjtag, "JexJtag_db_getIRLengthForIdcode");
+    ASSERT_TRUE(create && destroy && getCount && getSize && getTarget && lookup);
 
     unsigned h = 0;
     ASSERT_EQ(JEX_SUCCESS, create(nullptr, 0, nullptr, &h));
@@ -79,11 +98,14 @@ TEST(InstalledLayout, ACPluginBesideTheLibraryIsListedWithItsDescriptor)
     EXPECT_EQ(descriptor, std::string(xml.c_str()));
     EXPECT_STREQ("loopback_cable", name);
     EXPECT_STREQ("loopback", plugin);
+    unsigned irlen = 0;  // XC7A35T, from the installation's idcode.lst
+    EXPECT_EQ(JEX_SUCCESS, lookup(h, "00000011011000101101000010010011", &irlen));
+    EXPECT_EQ(6u, irlen);
     EXPECT_EQ(JEX_SUCCESS, destroy(h));
 
     // The copy stays loaded until the process ends: its process-wide message
     // manager lives as long as the library does.
-    g_keptLoaded = new jexplatform::DynamicLibrary(std::move(jexjtag));
+    g_keptLoaded->push_back(std::move(jexjtag));
 }
 
 } // namespace
