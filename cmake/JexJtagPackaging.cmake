@@ -16,7 +16,6 @@ set(CPACK_PACKAGE_NAME jexjtag)
 set(CPACK_PACKAGE_VERSION ${PROJECT_VERSION})
 set(CPACK_PACKAGE_VENDOR "libJexJtag")
 set(CPACK_PACKAGE_CONTACT "libJexJtag maintainers <jexjtag-maintainers@localhost>")
-set(CPACK_PACKAGE_DESCRIPTION_SUMMARY "JTAG boundary-scan access through run-time loaded cable plug-ins")
 set(CPACK_PACKAGING_INSTALL_PREFIX /usr)
 set(CPACK_DEB_COMPONENT_INSTALL ON)
 set(CPACK_COMPONENTS_GROUPING ONE_PER_GROUP)
@@ -27,27 +26,28 @@ set(CPACK_DEBIAN_PACKAGE_SHLIBDEPS ON)
 set(CPACK_DEBIAN_PACKAGE_SHLIBDEPS_PRIVATE_DIRS ${JEXJTAG_OUT_LIB})
 set(_exact "(= ${PROJECT_VERSION}-1)")
 
+# Each *_DESCRIPTION: the summary line, then the long text.
 set(CPACK_DEBIAN_RUNTIME_PACKAGE_NAME libjexjtag${PROJECT_VERSION_MAJOR})
 set(CPACK_DEBIAN_RUNTIME_PACKAGE_SECTION libs)
 set(CPACK_DEBIAN_RUNTIME_PACKAGE_GENERATE_SHLIBS ON)
 set(CPACK_DEBIAN_RUNTIME_DESCRIPTION "JTAG boundary-scan library with its cable plug-ins
- libJexJtag reaches IEEE 1149.1 boundary-scan chains through cable plug-ins
- loaded at run time; this package holds the library, the shipped cable
- plug-ins, the device list and the udev rules.")
+libJexJtag reaches IEEE 1149.1 boundary-scan chains through cable plug-ins
+loaded at run time; this package holds the library, the shipped cable
+plug-ins and share/jexjtag (the device list, udev rules).")
 
 set(CPACK_DEBIAN_DEV_PACKAGE_NAME libjexjtag-dev)
 set(CPACK_DEBIAN_DEV_PACKAGE_SECTION libdevel)
 set(CPACK_DEBIAN_DEV_PACKAGE_DEPENDS "libjexjtag${PROJECT_VERSION_MAJOR} ${_exact}")
 set(CPACK_DEBIAN_DEV_DESCRIPTION "JTAG boundary-scan library - development files
- Headers of the C API, the C++ class interface and the plug-in ABI, the
- CMake package (find_package(JexJtag)), the pkg-config file and the cable SDK.")
+Headers of the C API, the C++ class interface and the plug-in ABI, the
+CMake package (find_package(JexJtag)), the pkg-config file and the cable SDK.")
 
 set(CPACK_DEBIAN_CLI_PACKAGE_NAME jexjtag)
 set(CPACK_DEBIAN_CLI_PACKAGE_SECTION electronics)
 set(CPACK_DEBIAN_CLI_PACKAGE_DEPENDS "libjexjtag${PROJECT_VERSION_MAJOR} ${_exact}")
 set(CPACK_DEBIAN_CLI_DESCRIPTION "JTAG boundary-scan chains from the shell
- The jexjtag program lists cables, scans chains, shifts registers and reads
- BSDL files through libJexJtag.")
+The jexjtag program lists cables, scans chains, shifts registers and reads
+BSDL files through libJexJtag.")
 
 set(CPACK_DEBIAN_PYTHON_PACKAGE_NAME python3-jexjtag)
 set(CPACK_DEBIAN_PYTHON_PACKAGE_SECTION python)
@@ -55,7 +55,7 @@ set(CPACK_DEBIAN_PYTHON_PACKAGE_ARCHITECTURE all)
 set(CPACK_DEBIAN_PYTHON_PACKAGE_SHLIBDEPS OFF)
 set(CPACK_DEBIAN_PYTHON_PACKAGE_DEPENDS "python3, libjexjtag${PROJECT_VERSION_MAJOR} (>= ${PROJECT_VERSION})")
 set(CPACK_DEBIAN_PYTHON_DESCRIPTION "JTAG boundary-scan chains from Python
- The jexjtag package: standard-library ctypes over the C API of libJexJtag.")
+The jexjtag package: standard-library ctypes over the C API of libJexJtag.")
 
 include(CPack)
 
@@ -66,9 +66,10 @@ foreach(group runtime dev cli python)
 endforeach()
 foreach(component ${_components})
   string(TOLOWER "${component}" _name)
+  string(REPLACE "-" "_" _words "_${_name}_")
   if(_name MATCHES "^(cli|python)$")
     set(_group ${_name})
-  elseif(_name MATCHES "(^|[_-])devel?($|[_-])|sdk")  # not "udev": udev rules are runtime
+  elseif(_words MATCHES "_dev(el)?_|sdk")  # not "udev": udev rules are runtime
     set(_group dev)
   else()
     set(_group runtime)

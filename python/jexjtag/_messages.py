@@ -13,6 +13,8 @@ from typing import Dict, Optional, Tuple
 from . import _library as lib
 
 logger = logging.getLogger("jexjtag")
+# Silent until the application configures logging (errors also arrive as JtagError).
+logger.addHandler(logging.NullHandler())
 
 _LEVELS = {
     lib.JEX_MSG_ERROR: logging.ERROR,
