@@ -1,7 +1,9 @@
 #!/usr/bin/env bash
 # Builds the libFuzzer targets (clang, separate build directory) when needed
 # and runs every fuzzer found in <builddir>/fuzz for $FUZZ_SECONDS seconds
-# (default 60) on its seed corpus fuzz/corpus/<name>/.  Fails when any
+# (default 60) on its seed corpus: the directories listed in
+# <builddir>/fuzz/<name>.seeds (see fuzz/CMakeLists.txt), else
+# fuzz/corpus/<name>/.  Fails when any
 # fuzzer fails; crash inputs are kept in <builddir>/fuzz-artifacts/.
 #
 #   scripts/run-fuzzers.sh [builddir]        (default: build-fuzz)
@@ -27,13 +29,17 @@ ran=0
 for fuzzer in "$build"/fuzz/*; do
     [[ -f $fuzzer && -x $fuzzer ]] || continue
     name=$(basename "$fuzzer")
-    # Seed corpora are named after the fuzzer without its "_fuzzer" suffix.
-    corpus=$root/fuzz/corpus/${name%_fuzzer}
-    [[ -d $corpus ]] || corpus=$root/fuzz/corpus/$name
     # New inputs go to a scratch directory; the seed corpus stays as it is.
     work=$(mktemp -d)
     seeds=()
-    [[ -d $corpus ]] && seeds=("$corpus")
+    if [[ -f $build/fuzz/$name.seeds ]]; then
+        while IFS= read -r dir; do [[ -d $dir ]] && seeds+=("$dir"); done < "$build/fuzz/$name.seeds"
+    else
+        # Seed corpora are named after the fuzzer without its "_fuzzer" suffix.
+        corpus=$root/fuzz/corpus/${name%_fuzzer}
+        [[ -d $corpus ]] || corpus=$root/fuzz/corpus/$name
+        [[ -d $corpus ]] && seeds=("$corpus")
+    fi
     echo "== $name: ${seconds}s on ${seeds[*]:-an empty corpus}"
     log=$build/$name.log
     "$fuzzer" -max_total_time="$seconds" -timeout=10 -print_final_stats=1 \

@@ -1,9 +1,8 @@
-// The JSON writer: layout, escaping, UTF-8 repair and misuse.
+// The JSON writer: layout, escaping and UTF-8 repair.
 
 #include <gtest/gtest.h>
 
 #include <sstream>
-#include <stdexcept>
 #include <string>
 
 #include "JsonWriter.hpp"
@@ -93,25 +92,3 @@ TEST(JsonWriterTest, ValidUtf8PassesAndInvalidBytesBecomeReplacementCharacters)
     EXPECT_NO_THROW(roundTrip(soup + soup));
 }
 
-TEST(JsonWriterTest, MisuseIsRefused)
-{
-    std::ostringstream out;
-    {
-        JsonWriter json(out);
-        json.beginObject();
-        EXPECT_THROW(json.string("no key"), std::logic_error);
-        EXPECT_THROW(json.endArray(), std::logic_error);
-        json.key("k");
-        EXPECT_THROW(json.key("again"), std::logic_error);
-        EXPECT_THROW(json.endObject(), std::logic_error); // key without value
-    }
-    {
-        JsonWriter json(out);
-        EXPECT_THROW(json.key("top"), std::logic_error);
-        json.beginArray();
-        EXPECT_THROW(json.finish(), std::logic_error);
-        json.endArray();
-        EXPECT_THROW(json.null(), std::logic_error); // a second document
-        EXPECT_NO_THROW(json.finish());
-    }
-}

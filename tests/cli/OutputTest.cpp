@@ -211,14 +211,14 @@ TEST(MessageSinkTest, PrefixByTypeAndOneLineEndEach)
     EXPECT_EQ("noise: n\nsilent: s\ndebug(7): d\nerror: two\nlines\n", verboseOut.str());
 }
 
-TEST(HelpTextTest, ShiftExplainsTheBitOrderAndUsageErrorsGiveAHint)
+TEST(HelpTextTest, TheOverviewListsTheTableInOrder)
 {
-    // Every command's help (usage, examples, --json) is checked end to end in CliProgramTest.
-    EXPECT_EQ(0u, helpText(Command::None).find("Usage: jexjtag"));
-    EXPECT_EQ(helpText(Command::None), helpText(Command::Help));
-    const std::string shift = helpText(Command::Shift);
-    EXPECT_NE(std::string::npos, shift.find("LAST digit"));
-    EXPECT_NE(std::string::npos, shift.find("PAUSE_DR"));
-    EXPECT_EQ("Try 'jexjtag scan --help'.", usageHint(Command::Scan));
-    EXPECT_EQ("Try 'jexjtag --help'.", usageHint(Command::None));
+    // A synopsis too wide for the column puts its summary on the next line.
+    const Command shortOne{"ab", "ab X", "first", {}, 0, 0, nullptr, nullptr, nullptr, nullptr};
+    const Command longOne{"cd", "cd --a-long-option", "second", {}, 0, 0, nullptr, nullptr, nullptr, nullptr};
+    const std::string text = overviewText({&shortOne, &longOne});
+    EXPECT_EQ(0u, text.find("Usage: jexjtag"));
+    EXPECT_NE(std::string::npos,
+              text.find("\nCommands:\n  ab X               first\n  cd --a-long-option\n                     second\n\n"))
+        << text;
 }

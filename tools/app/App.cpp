@@ -5,15 +5,10 @@
 #include <vector>
 
 #include "ArgParser.hpp"
-#include "BsdlCommand.hpp"
 #include "CliError.hpp"
+#include "CommandTable.hpp"
 #include "HelpText.hpp"
-#include "InfoCommand.hpp"
-#include "LookupCommand.hpp"
 #include "MessageSink.hpp"
-#include "ScanCommand.hpp"
-#include "ShiftCommand.hpp"
-#include "TargetsCommand.hpp"
 #include "UsageError.hpp"
 #include "jexjtag/jexjtag.h"
 
@@ -30,11 +25,11 @@ constexpr int kExitFailed = 1;
 constexpr int kExitUsage = 2;
 
 // The command named on a command line that did not parse, for the hint.
-Command guessCommand(const std::vector<std::string>& args)
+const Command* guessCommand(const std::vector<std::string>& args)
 {
     for (const std::string& arg : args)
-        if (const auto command = commandFromName(arg)) return *command;
-    return Command::None;
+        if (const Command* command = findCommand(commandTable(), arg)) return command;
+    return nullptr;
 }
 
 // The library reads its log settings when logging starts, on the first call.
@@ -54,20 +49,6 @@ void printVersion(std::ostream& out)
         << version << std::dec << std::nouppercase << " (" << text << ")\n";
 }
 
-void runCommand(const Options& options, MessageSink& sink, std::ostream& out)
-{
-    switch (options.command) {
-    case Command::Targets: runTargets(options, sink, out); break;
-    case Command::Scan: runScan(options, sink, out); break;
-    case Command::Lookup: runLookup(options, sink, out); break;
-    case Command::Bsdl: runBsdl(options, sink, out); break;
-    case Command::Shift: runShift(options, sink, out); break;
-    case Command::Info: runInfo(options, sink, out); break;
-    case Command::None:
-    case Command::Help: break;
-    }
-}
-
 } // namespace
 
 int App::run(int argc, char** argv, std::ostream& out, std::ostream& err)
@@ -75,17 +56,14 @@ int App::run(int argc, char** argv, std::ostream& out, std::ostream& err)
     const std::vector<std::string> args(argv + (argc > 0 ? 1 : 0), argv + (argc > 0 ? argc : 0));
     Options options;
     try {
-        options = ArgParser::parse(args);
+        options = ArgParser::parse(args, commandTable());
     } catch (const UsageError& e) {
         err << "jexjtag: " << e.what() << '\n' << usageHint(guessCommand(args)) << '\n';
         return kExitUsage;
     }
 
-    if (options.help || options.command == Command::Help) {
-        Command topic = options.command;
-        if (options.command == Command::Help && !options.operands.empty())
-            topic = commandFromName(options.operands[0]).value_or(Command::None);
-        out << helpText(topic);
+    if (options.help) {
+        out << (options.command ? options.command->page() : overviewText(commandTable()));
         return kExitSuccess;
     }
 
@@ -97,7 +75,7 @@ int App::run(int argc, char** argv, std::ostream& out, std::ostream& err)
 
     MessageSink sink(err, options.verbose);
     try {
-        runCommand(options, sink, out);
+        options.command->run(options, sink, out);
         out.flush();
         if (!out.good()) {
             err << "jexjtag: cannot write the output\n";

@@ -1,4 +1,4 @@
-#include "BsdlCommand.hpp"
+// The "bsdl" command.
 
 #include <cerrno>
 #include <cstdio>
@@ -8,11 +8,26 @@
 #include "BsdlOutput.hpp"
 #include "CliError.hpp"
 #include "LibrarySession.hpp"
+#include "MessageSink.hpp"
+#include "Options.hpp"
 #include "jexjtag/jexjtag.h"
 
 namespace jexjtag::cli {
 
 namespace {
+
+const char* const kPage = R"HELP(Usage: jexjtag bsdl FILE [OPTIONS]
+
+Reads a BSDL file and prints the device's entity name, its instruction
+register length, its IDCODE register (as the file writes it, X for bits
+that do not matter) and the opcode of its BYPASS instruction.
+
+Options:
+      --json      {"file", "entity", "ir_length", "idcode", "bypass"}
+
+Examples:
+  jexjtag bsdl xc7a35t_csg324.bsd
+)HELP";
 
 constexpr unsigned kTextSize = 2048;
 
@@ -23,8 +38,6 @@ void checkReadable(const std::string& path)
     if (!file) throw CliError("cannot read BSDL file '" + path + "': " + std::strerror(errno));
     std::fclose(file);
 }
-
-} // namespace
 
 void runBsdl(const Options& options, MessageSink& sink, std::ostream& out)
 {
@@ -49,5 +62,16 @@ void runBsdl(const Options& options, MessageSink& sink, std::ostream& out)
     if (options.json) writeBsdlJson(out, result);
     else writeBsdlText(out, result);
 }
+
+} // namespace
+
+extern const Command bsdlCommand = {
+    "bsdl", "bsdl FILE", "read a BSDL file: entity, IR length, IDCODE, BYPASS",
+    {},
+    1, 1, "needs one BSDL file",
+    nullptr,
+    [] { return std::string(kPage); },
+    runBsdl,
+};
 
 } // namespace jexjtag::cli

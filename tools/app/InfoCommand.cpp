@@ -1,14 +1,32 @@
-#include "InfoCommand.hpp"
+// The "info" command.
 
 #include <memory>
 
 #include "CliError.hpp"
 #include "InfoOutput.hpp"
 #include "LibrarySession.hpp"
+#include "MessageSink.hpp"
+#include "Options.hpp"
 #include "TargetConnection.hpp"
 #include "jexjtag/jexjtag.h"
 
 namespace jexjtag::cli {
+
+namespace {
+
+const char* const kPage = R"HELP(Usage: jexjtag info [OPTIONS]
+
+Opens the target and prints its information record (names, versions,
+vendor, frequency, port, flags) and the library's API version.
+
+Options:
+      --json      {"api_version", "api_version_text", "target": {...}}
+  -t, --target TYPE, -a, --arg KEY=VALUE, --chain CHAIN: see jexjtag --help
+
+Examples:
+  jexjtag info
+  jexjtag info --target jtag_sim --arg new_firmware=1 --json
+)HELP";
 
 void runInfo(const Options& options, MessageSink& sink, std::ostream& out)
 {
@@ -32,5 +50,16 @@ void runInfo(const Options& options, MessageSink& sink, std::ostream& out)
     if (options.json) writeInfoJson(out, result);
     else writeInfoText(out, result);
 }
+
+} // namespace
+
+extern const Command infoCommand = {
+    "info", "info", "print the target's information record and the API version",
+    {},
+    0, 0, nullptr,
+    nullptr,
+    [] { return std::string(kPage); },
+    runInfo,
+};
 
 } // namespace jexjtag::cli

@@ -1,111 +1,54 @@
 #include "ArgParser.hpp"
 
-#include <cctype>
-
-#include "DataText.hpp"
-#include "NumberText.hpp"
-#include "TapStateName.hpp"
 #include "UsageError.hpp"
 
 namespace jexjtag::cli {
 
 namespace {
 
-enum class Id {
-    Help,
-    Version,
-    Json,
-    Verbose,
-    Target,
-    Arg,
-    Chain,
-    LockWait,
-    NoLock,
-    LogLevel,
-    LogFile,
-    DataDir,
-    Xml,
-    NoAutodetect,
-    Device,
-    Bits,
-    Exit,
-    Ir
-};
+// The options every command takes.  A command's own options are in its
+// entry (Command::options).
+enum class Id { Help, Version, Json, Verbose, Target, Arg, Chain, LockWait, NoLock, LogLevel, LogFile, DataDir };
 
-// Which commands an option applies to; kAll for the global ones.
-enum : unsigned {
-    kTargets = 1u << 0,
-    kScan = 1u << 1,
-    kShift = 1u << 2,
-    kAll = ~0u,
-};
-
-struct OptionSpec {
+struct GlobalOption {
     Id id;
     const char* longName;
     char shortName;
     bool takesValue;
-    unsigned commands;
 };
 
-const OptionSpec kOptions[] = {
-    {Id::Help, "help", 'h', false, kAll},
-    {Id::Version, "version", 0, false, kAll},
-    {Id::Json, "json", 0, false, kAll},
-    {Id::Verbose, "verbose", 'v', false, kAll},
-    {Id::Target, "target", 't', true, kAll},
-    {Id::Arg, "arg", 'a', true, kAll},
-    {Id::Chain, "chain", 0, true, kAll},
-    {Id::LockWait, "lock-wait", 0, true, kAll},
-    {Id::NoLock, "no-lock", 0, false, kAll},
-    {Id::LogLevel, "log-level", 0, true, kAll},
-    {Id::LogFile, "log-file", 0, true, kAll},
-    {Id::DataDir, "datadir", 0, true, kAll},
-    {Id::Xml, "xml", 0, false, kTargets},
-    {Id::NoAutodetect, "no-autodetect", 0, false, kScan | kShift},
-    {Id::Device, "device", 'd', true, kShift},
-    {Id::Bits, "bits", 'n', true, kShift},
-    {Id::Exit, "exit", 0, true, kShift},
-    {Id::Ir, "ir", 0, true, kShift},
+const GlobalOption kGlobalOptions[] = {
+    {Id::Help, "help", 'h', false},          {Id::Version, "version", 0, false},
+    {Id::Json, "json", 0, false},            {Id::Verbose, "verbose", 'v', false},
+    {Id::Target, "target", 't', true},       {Id::Arg, "arg", 'a', true},
+    {Id::Chain, "chain", 0, true},           {Id::LockWait, "lock-wait", 0, true},
+    {Id::NoLock, "no-lock", 0, false},       {Id::LogLevel, "log-level", 0, true},
+    {Id::LogFile, "log-file", 0, true},      {Id::DataDir, "datadir", 0, true},
 };
 
-unsigned commandBit(Command command)
+const GlobalOption* findGlobal(const std::string& longName, char shortName)
 {
-    switch (command) {
-    case Command::Targets: return kTargets;
-    case Command::Scan: return kScan;
-    case Command::Shift: return kShift;
-    default: return 0;
-    }
-}
-
-const OptionSpec* findLong(const std::string& name)
-{
-    for (const OptionSpec& option : kOptions)
-        if (name == option.longName) return &option;
+    for (const GlobalOption& option : kGlobalOptions)
+        if (shortName != 0 ? option.shortName == shortName : longName == option.longName) return &option;
     return nullptr;
 }
 
-const OptionSpec* findShort(char name)
+// A command's option: that of the command given so far, else the first
+// command that has one of this name (it may not apply: checked at the end).
+const CommandOption* findCommandOption(const std::vector<const Command*>& commands, const Command* given,
+                                       const std::string& longName, char shortName)
 {
-    for (const OptionSpec& option : kOptions)
-        if (option.shortName != 0 && option.shortName == name) return &option;
+    const auto find = [&](const Command& command) {
+        return shortName != 0 ? command.findShortOption(shortName) : command.findOption(longName);
+    };
+    if (given)
+        if (const CommandOption* option = find(*given)) return option;
+    for (const Command* command : commands)
+        if (const CommandOption* option = find(*command)) return option;
     return nullptr;
 }
 
-std::string displayName(const OptionSpec& option) { return std::string("--") + option.longName; }
-
-unsigned numberValue(const OptionSpec& option, const std::string& value, unsigned maximum = 0xFFFFFFFFu)
-{
-    const auto number = parseUnsigned(value, maximum);
-    if (!number)
-        throw UsageError(displayName(option) + " needs a number" +
-                         (maximum != 0xFFFFFFFFu ? " from 0 to " + std::to_string(maximum) : std::string()) +
-                         ", not '" + value + "'");
-    return *number;
-}
-
-void apply(Options& options, const OptionSpec& option, const std::string& value)
+void apply(Options& options, const GlobalOption& option, const std::string& value)
 {
     switch (option.id) {
     case Id::Help: options.help = true; break;
@@ -127,9 +70,9 @@ void apply(Options& options, const OptionSpec& option, const std::string& value)
         if (value.empty()) throw UsageError("--chain needs a chain description such as 0x4BA00477:4,0x0362D093:6");
         options.targetArgs.push_back("chain=" + value);
         break;
-    case Id::LockWait: options.lockWaitMs = numberValue(option, value); break;
+    case Id::LockWait: options.lockWaitMs = optionNumber(option.longName, value); break;
     case Id::NoLock: options.noLock = true; break;
-    case Id::LogLevel: options.logLevel = numberValue(option, value, kMaxLogLevel); break;
+    case Id::LogLevel: options.logLevel = optionNumber(option.longName, value, kMaxLogLevel); break;
     case Id::LogFile:
         if (value.empty()) throw UsageError("--log-file needs a file name");
         options.logFile = value;
@@ -138,67 +81,26 @@ void apply(Options& options, const OptionSpec& option, const std::string& value)
         if (value.empty()) throw UsageError("--datadir needs a directory");
         options.dataDir = value;
         break;
-    case Id::Xml: options.xml = true; break;
-    case Id::NoAutodetect: options.noAutodetect = true; break;
-    case Id::Device: options.device = numberValue(option, value); break;
-    case Id::Bits: options.bits = numberValue(option, value); break;
-    case Id::Exit: options.exitState = parseTapState(value); break;
-    case Id::Ir:
-        if (value.empty()) throw UsageError("--ir needs the instruction to shift");
-        options.irData = value;
-        break;
     }
 }
 
-void checkOperands(Options& options)
+void checkOperands(const Options& options)
 {
-    const std::string name = commandName(options.command);
+    const Command& command = *options.command;
     const size_t count = options.operands.size();
-    const auto expect = [&](size_t minimum, size_t maximum, const char* what) {
-        if (count < minimum || count > maximum)
-            throw UsageError("'" + name + "' " + what + " (" + std::to_string(count) + " given)");
-    };
-    switch (options.command) {
-    case Command::None:
-        throw UsageError("no command given");
-    case Command::Help:
-        expect(0, 1, "takes at most one command name");
-        if (count == 1 && !commandFromName(options.operands[0]))
-            throw UsageError("unknown command '" + options.operands[0] + "'");
-        break;
-    case Command::Targets:
-    case Command::Scan:
-    case Command::Info:
-        expect(0, 0, "takes no operands");
-        break;
-    case Command::Lookup:
-        expect(1, 1, "needs one IDCODE");
-        break;
-    case Command::Bsdl:
-        expect(1, 1, "needs one BSDL file");
-        break;
-    case Command::Shift: {
-        expect(1, 2, "needs ir or dr and the data to shift");
-        std::string reg = options.operands[0];
-        for (char& c : reg) c = static_cast<char>(std::tolower(static_cast<unsigned char>(c)));
-        if (reg != "ir" && reg != "dr")
-            throw UsageError("'shift' needs ir or dr first, not '" + options.operands[0] + "'");
-        options.operands[0] = reg;
-        if (options.bits && (*options.bits == 0 || *options.bits > kMaxDataBits))
-            throw UsageError("--bits needs a length from 1 to " + std::to_string(kMaxDataBits));
-        if (count == 1 && !options.bits) throw UsageError("'shift' needs data to shift, or --bits N to read only");
-        if (options.irData && reg == "ir") throw UsageError("--ir goes with 'shift dr' only");
-        break;
-    }
-    }
+    if (count < command.minOperands || count > command.maxOperands)
+        throw UsageError(std::string("'") + command.name + "' " +
+                         (command.operandRule ? command.operandRule : "takes no operands") + " (" +
+                         std::to_string(count) + " given)");
+    if (command.check) command.check(options);
 }
 
 } // namespace
 
-Options ArgParser::parse(const std::vector<std::string>& args)
+Options ArgParser::parse(const std::vector<std::string>& args, const std::vector<const Command*>& commands)
 {
     Options options;
-    std::vector<const OptionSpec*> given;
+    std::vector<std::string> commandOptionsGiven;
     bool optionsEnded = false;
     for (size_t i = 0; i < args.size(); ++i) {
         const std::string& arg = args[i];
@@ -211,17 +113,17 @@ Options ArgParser::parse(const std::vector<std::string>& args)
         if (!isLong && !isShort) {
             if (!optionsEnded && arg.size() > 1 && arg[0] == '-')
                 throw UsageError("unknown option '" + arg + "'");
-            if (options.command == Command::None) {
-                const auto command = commandFromName(arg);
-                if (!command) throw UsageError("unknown command '" + arg + "'");
-                options.command = *command;
+            if (!options.command) {
+                options.command = findCommand(commands, arg);
+                if (!options.command) throw UsageError("unknown command '" + arg + "'");
             } else {
                 options.operands.push_back(arg);
             }
             continue;
         }
 
-        std::string name = isLong ? arg.substr(2) : arg.substr(1);
+        std::string name = isLong ? arg.substr(2) : std::string();
+        const char shortName = isLong ? 0 : arg[1];
         std::string value;
         bool hasValue = false;
         if (isLong) {
@@ -232,24 +134,31 @@ Options ArgParser::parse(const std::vector<std::string>& args)
                 hasValue = true;
             }
         }
-        const OptionSpec* option = isLong ? findLong(name) : findShort(name[0]);
-        if (!option) throw UsageError("unknown option '" + (isLong ? "--" + name : arg) + "'");
-        if (option->takesValue && !hasValue) {
-            if (i + 1 >= args.size()) throw UsageError(displayName(*option) + " needs a value");
+        const GlobalOption* global = findGlobal(name, shortName);
+        const CommandOption* own = global ? nullptr : findCommandOption(commands, options.command, name, shortName);
+        if (!global && !own) throw UsageError("unknown option '" + (isLong ? "--" + name : arg) + "'");
+        const std::string longName = global ? global->longName : own->longName;
+        const bool takesValue = global ? global->takesValue : own->takesValue;
+        if (takesValue && !hasValue) {
+            if (i + 1 >= args.size()) throw UsageError("--" + longName + " needs a value");
             value = args[++i];
-        } else if (!option->takesValue && hasValue) {
-            throw UsageError(displayName(*option) + " takes no value");
+        } else if (!takesValue && hasValue) {
+            throw UsageError("--" + longName + " takes no value");
         }
-        apply(options, *option, value);
-        given.push_back(option);
+        if (global) {
+            apply(options, *global, value);
+        } else {
+            if (own->checkValue) own->checkValue(longName, value);
+            options.commandValues[longName].push_back(value);
+            commandOptionsGiven.push_back(longName);
+        }
     }
 
-    for (const OptionSpec* option : given)
-        if (option->commands != kAll && options.command != Command::None &&
-            (option->commands & commandBit(options.command)) == 0)
-            throw UsageError("option " + displayName(*option) + " does not apply to '" + commandName(options.command) +
-                             "'");
+    for (const std::string& longName : commandOptionsGiven)
+        if (options.command && !options.command->findOption(longName))
+            throw UsageError("option --" + longName + " does not apply to '" + options.command->name + "'");
     if (options.help || options.version) return options;
+    if (!options.command) throw UsageError("no command given");
     checkOperands(options);
     return options;
 }

@@ -7,7 +7,9 @@
 // "--name=value" are the same; "--" ends the options.  Options of one
 // command given to another, unknown options, bad values and wrong operand
 // counts are usage errors (UsageError).  With --help or --version the
-// operands are not checked.
+// operands are not checked.  The options every command takes are the
+// parser's own; each command brings its name, options and operand rules in
+// its entry (Command).
 
 #include <string>
 #include <vector>
@@ -18,8 +20,9 @@ namespace jexjtag::cli {
 
 class ArgParser {
 public:
-    // args: the arguments after the program name.
-    static Options parse(const std::vector<std::string>& args);
+    // args: the arguments after the program name; commands: the program's
+    // command table.
+    static Options parse(const std::vector<std::string>& args, const std::vector<const Command*>& commands);
 };
 
 } // namespace jexjtag::cli

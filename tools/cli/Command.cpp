@@ -2,30 +2,25 @@
 
 namespace jexjtag::cli {
 
-namespace {
-
-struct Entry {
-    Command command;
-    const char* name;
-};
-const Entry kCommands[] = {{Command::Help, "help"},     {Command::Targets, "targets"}, {Command::Scan, "scan"},
-                           {Command::Lookup, "lookup"}, {Command::Bsdl, "bsdl"},       {Command::Shift, "shift"},
-                           {Command::Info, "info"}};
-
-} // namespace
-
-std::optional<Command> commandFromName(const std::string& text)
+const CommandOption* Command::findOption(const std::string& longName) const
 {
-    for (const Entry& entry : kCommands)
-        if (text == entry.name) return entry.command;
-    return std::nullopt;
+    for (const CommandOption& option : options)
+        if (longName == option.longName) return &option;
+    return nullptr;
 }
 
-const char* commandName(Command command)
+const CommandOption* Command::findShortOption(char shortName) const
 {
-    for (const Entry& entry : kCommands)
-        if (entry.command == command) return entry.name;
-    return "";
+    for (const CommandOption& option : options)
+        if (option.shortName != 0 && option.shortName == shortName) return &option;
+    return nullptr;
+}
+
+const Command* findCommand(const std::vector<const Command*>& commands, const std::string& name)
+{
+    for (const Command* command : commands)
+        if (name == command->name) return command;
+    return nullptr;
 }
 
 } // namespace jexjtag::cli

@@ -1,12 +1,12 @@
 #pragma once
 // Everything the command line says, after parsing.
 
+#include <map>
 #include <optional>
 #include <string>
 #include <vector>
 
 #include "Command.hpp"
-#include "jexjtag/types.h"
 
 namespace jexjtag::cli {
 
@@ -15,7 +15,7 @@ constexpr unsigned kDefaultLockWaitMs = 5000;
 constexpr unsigned kMaxLogLevel = 5;
 
 struct Options {
-    Command command = Command::None;
+    const Command* command = nullptr; // null: no command given
     std::vector<std::string> operands; // after the command name
 
     // Program
@@ -35,17 +35,30 @@ struct Options {
     unsigned lockWaitMs = kDefaultLockWaitMs;
     bool noLock = false;
 
-    // targets
-    bool xml = false;
+    // The command's own options, by long name: every value given, in order
+    // ("" for each use of a flag).
+    std::map<std::string, std::vector<std::string>> commandValues;
 
-    // scan, shift
-    bool noAutodetect = false;
-
-    // shift
-    std::optional<unsigned> device;
-    std::optional<unsigned> bits;
-    std::optional<std::string> irData; // --ir: instruction shifted before a dr shift
-    unsigned exitState = JEXJTAG_RUN_TEST_IDLE;
+    // Whether the command's option --name was given.
+    bool flag(const std::string& name) const;
+    // The last value given to --name, or none.
+    std::optional<std::string> value(const std::string& name) const;
+    // Every value given to --name, in order (empty when not given).
+    std::vector<std::string> values(const std::string& name) const;
+    // The last value of --name as a decimal number up to maximum, or none
+    // when not given; anything else throws UsageError "--name needs a
+    // number[ from 0 to maximum], not 'value'".
+    std::optional<unsigned> number(const std::string& name, unsigned maximum = 0xFFFFFFFFu) const;
 };
+
+// value as a decimal number up to maximum, for option --name; throws
+// UsageError as Options::number does.
+unsigned optionNumber(const std::string& name, const std::string& value, unsigned maximum = 0xFFFFFFFFu);
+
+// CommandOption::checkValue for options that take a decimal number.
+void checkNumberValue(const std::string& name, const std::string& value);
+// CommandOption::checkValue for options whose value may not be empty:
+// "--name needs a value".
+void checkNonEmptyValue(const std::string& name, const std::string& value);
 
 } // namespace jexjtag::cli
