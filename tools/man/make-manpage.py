@@ -49,7 +49,8 @@ def sections(text):
 def commands(overview):
     for heading, lines in sections(overview):
         if heading == "Commands":
-            return [m.group(1) for m in (re.match(r"\s+([a-z]+)\b", line) for line in lines)
+            # "  name ..." lines; a summary pushed to its own line is indented further.
+            return [m.group(1) for m in (re.match(r"  ([a-z][a-z-]*)\b", line) for line in lines)
                     if m and m.group(1) != "help"]
     sys.exit("make-manpage: no Commands section in jexjtag --help")
 
