@@ -9,6 +9,7 @@
 
 #include <stdlib.h>
 #include <filesystem>
+#include <ostream>
 #include <string>
 #include <vector>
 
@@ -38,6 +39,8 @@ struct Layout {
     const char* libDir;     // relative to the prefix
     const char* pluginDir;  // relative to the prefix
 };
+
+void PrintTo(const Layout& layout, std::ostream* out) { *out << layout.name; }
 
 class InstalledLayout : public ::testing::TestWithParam<Layout> {};
 
