@@ -36,7 +36,8 @@ dpkg-deb -f "$build"/jexjtag_*.deb Depends | grep -q libjexjtag1 || fail "jexjta
 objdump -p "$lib/libJexJtag.so.1" | grep -q 'SONAME *libJexJtag.so.1$' || fail "SONAME is not libJexJtag.so.1"
 for f in "$lib/libJexJtag.so" "$lib/jexjtag/plugins/jexjtag/jtag_sim/jtag_sim.so" "$root/fs/usr/share/jexjtag/idcode.lst" \
          "$root/fs/usr/share/man/man1/jexjtag.1.gz" "$root/fs/usr/share/bash-completion/completions/jexjtag" \
-         "$root/fs/usr/include/jexjtag/jexjtag.h" "$root/fs/usr/lib/python3/dist-packages/jexjtag/_install.py"; do
+         "$root/fs/usr/include/jexjtag/jexjtag.h" "$root/fs/usr/include/jexjtag/cable/CableBase.hpp" \
+         "$lib/libjexjtag_cable.a" "$root/fs/usr/lib/python3/dist-packages/jexjtag/_install.py"; do
   [ -e "$f" ] || fail "missing ${f#$root/fs}"
 done
 

@@ -1,4 +1,4 @@
-#include "CableLock.hpp"
+#include "jexjtag/cable/CableLock.hpp"
 
 #include <algorithm>
 #include <utility>

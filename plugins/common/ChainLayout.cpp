@@ -1,4 +1,4 @@
-#include "ChainLayout.hpp"
+#include "jexjtag/cable/ChainLayout.hpp"
 
 namespace jexcable {
 

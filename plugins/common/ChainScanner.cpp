@@ -1,4 +1,4 @@
-#include "ChainScanner.hpp"
+#include "jexjtag/cable/ChainScanner.hpp"
 
 #include <string>
 

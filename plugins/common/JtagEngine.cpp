@@ -1,38 +1,48 @@
-#include "JtagEngine.hpp"
+#include "jexjtag/cable/JtagEngine.hpp"
 
 namespace jexcable {
 
-void JtagEngine::clockPath(TapController::Path path)
+void JtagEngine::movePath(TapController::Path path)
 {
-    for (unsigned i = 0; i < path.length; ++i) {
-        const bool tms = path.tmsAt(i);
-        m_transport->clock(tms, true);
-        m_tap.clock(tms);
-    }
+    if (path.length == 0) return;
+    m_transport->moveTms(&path.tms, path.length, true);
+    for (unsigned i = 0; i < path.length; ++i) m_tap.clock(path.tmsAt(i));
+    m_clocks += path.length;
+    m_lastTms = path.tmsAt(path.length - 1u);
+    m_lastTdi = true;
 }
 
 void JtagEngine::resetTap()
 {
-    for (int i = 0; i < 5; ++i) m_transport->clock(true, true);
+    const uint8_t ones = 0x1F;
+    m_transport->moveTms(&ones, 5, true);
     m_tap.setState(JEXJTAG_TEST_LOGIC_RESET);
+    m_stateKnown = true;
+    m_clocks += 5;
+    m_lastTms = true;
+    m_lastTdi = true;
 }
 
 void JtagEngine::moveTo(JexJtagTapState state)
 {
-    clockPath(TapController::path(m_tap.state(), state));
+    if (!m_stateKnown) resetTap();
+    movePath(TapController::path(m_tap.state(), state));
 }
 
 bool JtagEngine::holdClocks(uint32_t count)
 {
     if (count == 0) return true;
+    if (!m_stateKnown) resetTap();
     if (!TapController::isStable(m_tap.state())) return false;
-    const bool tms = TapController::holdingTms(m_tap.state());
     if (TapController::isShift(m_tap.state())) {
-        ShiftSink none = ShiftSink::discard();
-        m_transport->shift(ShiftSource::level(true), none, count, false);
+        transportShift(ShiftSource::level(true), ShiftSink::discard(), count, false);
         return true;
     }
-    for (uint32_t i = 0; i < count; ++i) m_transport->clock(tms, true);
+    const bool tms = TapController::holdingTms(m_tap.state());
+    m_transport->idleClocks(count, tms, true);
+    m_clocks += count;
+    m_lastTms = tms;
+    m_lastTdi = true;
     return true;
 }
 
@@ -40,21 +50,31 @@ bool JtagEngine::clock(bool tms, bool tdi)
 {
     const bool tdo = m_transport->clock(tms, tdi);
     m_tap.clock(tms);
+    ++m_clocks;
+    m_lastTms = tms;
+    m_lastTdi = tdi;
     return tdo;
+}
+
+void JtagEngine::transportShift(const ShiftSource& in, const ShiftSink& out, uint32_t count, bool tmsOnLast)
+{
+    m_transport->shift(in, out, count, tmsOnLast);
+    m_clocks += count;
+    m_lastTms = tmsOnLast;
+    m_lastTdi = in.bit(count - 1u);
 }
 
 void JtagEngine::padding(uint64_t bits, bool last)
 {
-    ShiftSink none = ShiftSink::discard();
     const ShiftSource ones = ShiftSource::level(true);
     while (bits > 0) {
         const uint32_t n = bits > 0x80000000u ? 0x80000000u : static_cast<uint32_t>(bits);
         bits -= n;
-        m_transport->shift(ones, none, n, last && bits == 0);
+        transportShift(ones, ShiftSink::discard(), n, last && bits == 0);
     }
 }
 
-void JtagEngine::shift(Register reg, const ShiftSource& in, ShiftSink& out, uint32_t bitCount,
+void JtagEngine::shift(Register reg, const ShiftSource& in, const ShiftSink& out, uint32_t bitCount,
                        JexJtagTapState exitState, uint64_t padBefore, uint64_t padAfter)
 {
     const JexJtagTapState shiftState = reg == Register::Instruction ? JEXJTAG_SHIFT_IR : JEXJTAG_SHIFT_DR;
@@ -66,18 +86,18 @@ void JtagEngine::shift(Register reg, const ShiftSource& in, ShiftSink& out, uint
     moveTo(shiftState);
     const bool leave = exitState != shiftState;
     padding(padBefore, leave && bitCount == 0 && padAfter == 0);
-    if (bitCount > 0) m_transport->shift(in, out, bitCount, leave && padAfter == 0);
+    if (bitCount > 0) transportShift(in, out, bitCount, leave && padAfter == 0);
     padding(padAfter, leave);
     if (leave) {
         m_tap.clock(true); // the last bit went with TMS high: Exit1
         moveTo(exitState);
     }
+    if (bitCount > 0 && out.wanted()) m_transport->flush();
 }
 
 void JtagEngine::shiftLevel(Register reg, bool tdi, uint8_t* out, uint32_t bitCount, JexJtagTapState exitState)
 {
-    ShiftSink sink = ShiftSink::buffer(out);
-    shift(reg, ShiftSource::level(tdi), sink, bitCount, exitState);
+    shift(reg, ShiftSource::level(tdi), ShiftSink::buffer(out), bitCount, exitState);
 }
 
 } // namespace jexcable

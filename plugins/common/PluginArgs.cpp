@@ -1,4 +1,4 @@
-#include "PluginArgs.hpp"
+#include "jexjtag/cable/PluginArgs.hpp"
 
 #include <cctype>
 
@@ -45,6 +45,37 @@ std::string PluginArgs::trim(const std::string& text)
     while (begin < end && std::isspace(static_cast<unsigned char>(text[begin]))) ++begin;
     while (end > begin && std::isspace(static_cast<unsigned char>(text[end - 1]))) --end;
     return text.substr(begin, end - begin);
+}
+
+bool PluginArgs::parseFrequency(const std::string& text, uint64_t maxHz, uint64_t& hz)
+{
+    std::string digits = trim(text);
+    uint64_t scale = 1;
+    if (!digits.empty()) {
+        const char last = digits.back();
+        if (last == 'k' || last == 'K') scale = 1000;
+        else if (last == 'M') scale = 1000000;
+        if (scale != 1) digits.pop_back();
+    }
+    if (digits.empty() || digits.size() > 10) return false;
+    uint64_t value = 0;
+    for (const char c : digits) {
+        if (c < '0' || c > '9') return false;
+        value = value * 10 + static_cast<uint64_t>(c - '0');
+    }
+    value *= scale;
+    if (value == 0 || value > maxHz) return false;
+    hz = value;
+    return true;
+}
+
+bool PluginArgs::parseFlag(const std::string& text, bool& flag)
+{
+    const std::string t = toLower(trim(text));
+    if (t == "1" || t == "true" || t == "yes" || t == "on") flag = true;
+    else if (t == "0" || t == "false" || t == "no" || t == "off") flag = false;
+    else return false;
+    return true;
 }
 
 } // namespace jexcable

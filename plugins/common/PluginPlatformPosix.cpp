@@ -1,5 +1,5 @@
 // POSIX implementation of PluginPlatform.
-#include "PluginPlatform.hpp"
+#include "jexjtag/cable/PluginPlatform.hpp"
 
 #include <cerrno>
 #include <cstdlib>

@@ -1,4 +1,4 @@
-#include "TapController.hpp"
+#include "jexjtag/cable/TapController.hpp"
 
 #include <array>
 

@@ -1,4 +1,4 @@
-#include "TextCopy.hpp"
+#include "jexjtag/cable/TextCopy.hpp"
 
 #include <algorithm>
 #include <cstring>

@@ -3,7 +3,7 @@
 #include <cctype>
 #include <cstdio>
 
-#include "PluginArgs.hpp"
+#include "jexjtag/cable/PluginArgs.hpp"
 
 namespace jexsim {
 

@@ -1,5 +1,7 @@
 #include "SimChain.hpp"
 
+#include "jexjtag/cable/PluginPlatform.hpp"
+
 namespace jexsim {
 
 SimChain::SimChain(const std::vector<DeviceSpec>& devices)
@@ -32,11 +34,38 @@ bool SimChain::inShiftState() const
     return true;
 }
 
-void SimChain::shift(const jexcable::ShiftSource& in, jexcable::ShiftSink& out, uint32_t count, bool tmsOnLast)
+void SimChain::moveTms(const uint8_t* tms, uint32_t count, bool tdi)
+{
+    for (uint32_t i = 0; i < count; ++i) clock(jexcable::BitBuffer::get(tms, i), tdi);
+}
+
+bool SimChain::drivePin(uint32_t pin, bool level)
+{
+    if (pin != JEXJTAG_TCK && pin != JEXJTAG_TMS && pin != JEXJTAG_TDI) return false;
+    if (pin == JEXJTAG_TDI) m_lastTdi = level;
+    if (m_observer) m_observer->onPinLevel(*this, pin, level);
+    return true;
+}
+
+bool SimChain::readPin(uint32_t pin, bool& level)
+{
+    if (pin != JEXJTAG_TDO) return false;
+    level = tdo(m_lastTdi);
+    return true;
+}
+
+void SimChain::sleep(uint32_t microseconds)
+{
+    if (m_observer) m_observer->onWait(microseconds);
+    jexcable::PluginPlatform::sleepMicroseconds(microseconds);
+}
+
+void SimChain::shift(const jexcable::ShiftSource& in, const jexcable::ShiftSink& out, uint32_t count,
+                     bool tmsOnLast)
 {
     if (count == 0) return;
     if (m_observer || !inShiftState()) {
-        JtagTransport::shift(in, out, count, tmsOnLast);
+        for (uint32_t i = 0; i < count; ++i) out.putBit(i, clock(i + 1 == count && tmsOnLast, in.bit(i)));
         return;
     }
     const std::size_t n = m_devices.size();

@@ -4,21 +4,23 @@
 // 0 is nearest TDO; its IDCODE leaves first in a DR scan after reset).  A
 // chain of no devices is a wire from TDI to TDO.
 //
-// It is the cable's transport: clock() is one TCK cycle, shift() a run of
-// cycles in a Shift state, which it moves 64 bits at a time through every
-// device unless an observer wants to see each clock.
+// It is the cable's transport: every call is done when it returns (nothing
+// is queued).  moveTms() and clock() are TCK cycles one by one; shift() a run
+// of cycles in a Shift state, which it moves 64 bits at a time through every
+// device unless an observer wants to see each clock.  Pin levels and waits
+// go to the observer; TDO can be read as a pin.
 
 #include <cstdint>
 #include <vector>
 
 #include "ChainObserver.hpp"
 #include "DeviceSpec.hpp"
-#include "JtagTransport.hpp"
+#include "jexjtag/cable/JtagTransport.hpp"
 #include "SimDevice.hpp"
 
 namespace jexsim {
 
-class SimChain : public jexcable::JtagTransport {
+class SimChain final : public jexcable::JtagTransport {
 public:
     explicit SimChain(const std::vector<DeviceSpec>& devices);
 
@@ -35,8 +37,16 @@ public:
     // Clocks are reported to the observer (none: null); not owned.
     void setObserver(ChainObserver* observer) { m_observer = observer; }
 
+    void moveTms(const uint8_t* tms, uint32_t count, bool tdi) override;
+    void shift(const jexcable::ShiftSource& in, const jexcable::ShiftSink& out, uint32_t count,
+               bool tmsOnLast) override;
     bool clock(bool tms, bool tdi) override;
-    void shift(const jexcable::ShiftSource& in, jexcable::ShiftSink& out, uint32_t count, bool tmsOnLast) override;
+    // TDI and TMS levels (TDI reaches TDO through a chain of no devices)
+    // and TCK going low, for the observer.
+    bool drivePin(uint32_t pin, bool level) override;
+    // TDO only: the chain's output now.
+    bool readPin(uint32_t pin, bool& level) override;
+    void sleep(uint32_t microseconds) override;
 
 private:
     bool inShiftState() const;

@@ -20,7 +20,7 @@
 #include <cstdint>
 
 #include "DeviceSpec.hpp"
-#include "TapController.hpp"
+#include "jexjtag/cable/TapController.hpp"
 
 namespace jexsim {
 

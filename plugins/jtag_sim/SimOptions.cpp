@@ -32,33 +32,12 @@ std::vector<DeviceSpec> SimOptions::defaultChain()
 
 bool SimOptions::parseFrequency(const std::string& text, uint64_t& hz)
 {
-    std::string digits = PluginArgs::trim(text);
-    uint64_t scale = 1;
-    if (!digits.empty()) {
-        const char last = digits.back();
-        if (last == 'k' || last == 'K') scale = 1000;
-        else if (last == 'M') scale = 1000000;
-        if (scale != 1) digits.pop_back();
-    }
-    if (digits.empty() || digits.size() > 10) return false;
-    uint64_t value = 0;
-    for (const char c : digits) {
-        if (c < '0' || c > '9') return false;
-        value = value * 10 + static_cast<uint64_t>(c - '0');
-    }
-    value *= scale;
-    if (value == 0 || value > kMaxFrequency) return false;
-    hz = value;
-    return true;
+    return PluginArgs::parseFrequency(text, kMaxFrequency, hz);
 }
 
 bool SimOptions::parseFlag(const std::string& text, bool& flag)
 {
-    const std::string t = PluginArgs::toLower(PluginArgs::trim(text));
-    if (t == "1" || t == "true" || t == "yes" || t == "on") flag = true;
-    else if (t == "0" || t == "false" || t == "no" || t == "off") flag = false;
-    else return false;
-    return true;
+    return PluginArgs::parseFlag(text, flag);
 }
 
 bool SimOptions::set(const std::string& rawKey, const std::string& value, std::string& error)

@@ -15,7 +15,7 @@
 #include <vector>
 
 #include "DeviceSpec.hpp"
-#include "PluginArgs.hpp"
+#include "jexjtag/cable/PluginArgs.hpp"
 
 namespace jexsim {
 

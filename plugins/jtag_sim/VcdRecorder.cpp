@@ -4,7 +4,7 @@
 #include <stdexcept>
 
 #include "SimChain.hpp"
-#include "TapController.hpp"
+#include "jexjtag/cable/TapController.hpp"
 
 namespace jexsim {
 

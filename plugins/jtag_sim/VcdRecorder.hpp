@@ -33,6 +33,13 @@ public:
     uint64_t now() const { return m_time; }
 
     void onClock(const SimChain& chain, bool tms, bool tdi, bool tdo) override;
+    // pinLevel(), then wait() and flush().
+    void onPinLevel(const SimChain& chain, unsigned pin, bool level) override { pinLevel(pin, level, chain); }
+    void onWait(uint64_t microseconds) override
+    {
+        wait(microseconds);
+        flush();
+    }
     // A pin driven without a clock edge (pin-level access); lasts half a cycle.
     void pinLevel(unsigned pin, bool level, const SimChain& chain);
     // Time passing without clocks.

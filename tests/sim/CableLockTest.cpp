@@ -1,60 +1,18 @@
-// The cross-process cable lock: contention between processes and cleaning of
-// stale lock files.  Release when the holder is killed is tested end to end
-// (tests/e2e/LockTest.cpp).
+// The cross-process cable lock: file names, directories and cleaning of
+// stale lock files.  Contention between processes, and release when the
+// holder is killed, are tested end to end (tests/e2e/LockTest.cpp).
 #include <gtest/gtest.h>
 
-#include <chrono>
+#include <filesystem>
 #include <fstream>
 
-#include <sys/wait.h>
-#include <unistd.h>
 
-#include "CableLock.hpp"
+#include "jexjtag/cable/CableLock.hpp"
 #include "support/TestSupport.hpp"
 
 using jexcable::CableLock;
 
 namespace {
-
-// A pipe used to pass one byte between parent and child.
-struct Pipe {
-    Pipe() { EXPECT_EQ(::pipe(fd), 0); }
-    ~Pipe()
-    {
-        ::close(fd[0]);
-        ::close(fd[1]);
-    }
-    void send(char c) { EXPECT_EQ(::write(fd[1], &c, 1), 1); }
-    char receive()
-    {
-        char c = 0;
-        return ::read(fd[0], &c, 1) == 1 ? c : '\0';
-    }
-    int fd[2];
-};
-
-// Runs `body` in a child process; its return value is the exit status.
-template <typename F>
-pid_t spawn(F body)
-{
-    const pid_t pid = ::fork();
-    if (pid == 0) {
-        int status = 1;
-        try {
-            status = body();
-        } catch (...) {
-        }
-        ::_exit(status);
-    }
-    return pid;
-}
-
-int waitExit(pid_t pid)
-{
-    int status = 0;
-    ::waitpid(pid, &status, 0);
-    return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
-}
 
 class CableLockTest : public ::testing::Test {
 protected:
@@ -63,32 +21,6 @@ protected:
 };
 
 } // namespace
-
-TEST_F(CableLockTest, SecondProcessWaitsUntilTheHolderReleases)
-{
-    CableLock lock("sim0");
-    ASSERT_TRUE(lock.acquire(0));
-    EXPECT_NE(lock.holderDescription().find("pid " + std::to_string(::getpid())), std::string::npos);
-
-    Pipe started;
-    Pipe result;
-    const pid_t child = spawn([&] {
-        CableLock other("sim0");
-        const auto t0 = std::chrono::steady_clock::now();
-        const bool gotAtOnce = other.acquire(0);
-        const bool gotIn100ms = other.acquire(100);
-        const auto waited = std::chrono::steady_clock::now() - t0;
-        started.send(gotAtOnce || gotIn100ms || waited < std::chrono::milliseconds(100) ? 'x' : 'w');
-        const bool gotLater = other.acquire(20000); // the parent releases meanwhile
-        result.send(gotLater ? 'y' : 'n');
-        return 0;
-    });
-    EXPECT_EQ(started.receive(), 'w') << "the child got the lock the parent held, or did not wait";
-    EXPECT_TRUE(lock.release());
-    EXPECT_EQ(result.receive(), 'y');
-    EXPECT_EQ(waitExit(child), 0);
-    EXPECT_FALSE(lock.isHeld());
-}
 
 TEST_F(CableLockTest, DifferentPortsDoNotContend)
 {

@@ -1,7 +1,7 @@
 // Chain interrogation: IDCODEs, device count and the IR-length heuristic.
 #include <gtest/gtest.h>
 
-#include "ChainScanner.hpp"
+#include "jexjtag/cable/ChainScanner.hpp"
 #include "SimChain.hpp"
 #include "SimOptions.hpp"
 #include "SimTestSupport.hpp"

@@ -3,8 +3,8 @@
 
 #include <random>
 
-#include "ChainLayout.hpp"
-#include "JtagEngine.hpp"
+#include "jexjtag/cable/ChainLayout.hpp"
+#include "jexjtag/cable/JtagEngine.hpp"
 #include "SimChain.hpp"
 #include "SimTestSupport.hpp"
 
@@ -44,8 +44,7 @@ struct Bench {
                                uint64_t before = 0, uint64_t after = 0, JexJtagTapState exit = JEXJTAG_RUN_TEST_IDLE)
     {
         std::vector<uint8_t> out(jexcable::BitBuffer::bytesFor(n), 0);
-        ShiftSink sink = ShiftSink::buffer(out.data());
-        engine.shift(reg, ShiftSource::buffer(in.data()), sink, n, exit, before, after);
+        engine.shift(reg, ShiftSource::buffer(in.data()), ShiftSink::buffer(out.data()), n, exit, before, after);
         return out;
     }
 
@@ -55,32 +54,12 @@ struct Bench {
 
 struct CountingObserver : jexsim::ChainObserver {
     void onClock(const SimChain&, bool, bool, bool) override { ++clocks; }
+    void onPinLevel(const SimChain&, unsigned, bool) override {}
+    void onWait(uint64_t) override {}
     uint64_t clocks = 0;
 };
 
 } // namespace
-
-TEST(SimModel, ResetSelectsIdcodeAndCaptureIrLoadsEachDevicesPattern)
-{
-    Bench b(threeDevices());
-    auto out = b.read(DR, 32 + 1 + 32 + 8);
-    EXPECT_EQ(value(out, 32, 0), 0x4BA00477u) << "device 0 leaves first";
-    EXPECT_EQ(value(out, 1, 32), 0u) << "a device without IDCODE selects BYPASS, which captures 0";
-    EXPECT_EQ(value(out, 32, 33), 0x0362D093u);
-    EXPECT_EQ(value(out, 8, 65), 0xFFu) << "then the TDI level comes through";
-
-    out = b.read(IR, 15);
-    EXPECT_EQ(value(out, 4, 0), 0x1u);
-    EXPECT_EQ(value(out, 5, 4), 0x5u);
-    EXPECT_EQ(value(out, 6, 9), 0x11u);
-    // After the scan every IR holds ones: BYPASS everywhere, until a reset.
-    for (std::size_t d = 0; d < b.chain.size(); ++d)
-        EXPECT_EQ(b.chain.device(d).selected(), SimDevice::DataRegister::Bypass);
-    b.engine.resetTap();
-    EXPECT_EQ(b.chain.device(0).selected(), SimDevice::DataRegister::Idcode);
-    EXPECT_EQ(b.chain.device(1).selected(), SimDevice::DataRegister::Bypass);
-    EXPECT_EQ(b.chain.device(2).selected(), SimDevice::DataRegister::Idcode);
-}
 
 TEST(SimModel, EveryUnassignedOpcodeActsAsBypass)
 {
@@ -99,62 +78,6 @@ TEST(SimModel, EveryUnassignedOpcodeActsAsBypass)
             EXPECT_EQ(value(out, 39, 1), (uint64_t{1} << 39) - 1) << "opcode " << opcode << ": one-bit register";
         }
     }
-}
-
-TEST(SimModel, UserRegisterKeepsWhatIsWritten)
-{
-    Bench b({simtest::device(0x0362D093, 6, 0x09, 0x02, 32)});
-    b.write(IR, bits(0x02, 6), 6);
-    b.write(DR, bits(0xCAFEF00D, 32), 32);
-    EXPECT_EQ(b.chain.device(0).userRegister(), 0xCAFEF00Du);
-    // Read back while writing the next value.
-    const auto old = b.write(DR, bits(0x12345678, 32), 32);
-    EXPECT_EQ(value(old, 32), 0xCAFEF00Du);
-    // A read drives TDI too: what it shifts in is what the register keeps.
-    EXPECT_EQ(value(b.read(DR, 32, false), 32), 0x12345678u);
-    EXPECT_EQ(b.chain.device(0).userRegister(), 0u);
-    b.write(DR, bits(0x0BADCAFE, 32), 32);
-    // Test-Logic-Reset changes the instruction, not the register.
-    b.engine.resetTap();
-    b.write(IR, bits(0x02, 6), 6);
-    EXPECT_EQ(value(b.read(DR, 32), 32), 0x0BADCAFEu);
-}
-
-TEST(SimModel, DeviceRelativeShiftsAddressOnlyTheirDevice)
-{
-    Bench b(threeDevices());
-    ChainLayout layout;
-    layout.assign({{0x4BA00477, 4}, {0, 5}, {0x0362D093, 6}});
-    // Device 2 gets USER1, the others BYPASS through the padding.
-    b.write(IR, bits(0x02, 6), 6, layout.irBitsBefore(2), layout.irBitsAfter(2));
-    EXPECT_EQ(b.chain.device(0).instruction(), 0xFu);
-    EXPECT_EQ(b.chain.device(1).instruction(), 0x1Fu);
-    EXPECT_EQ(b.chain.device(2).instruction(), 0x02u);
-    b.write(DR, bits(0xA5A5A5A5, 32), 32, layout.bypassBitsBefore(2), layout.bypassBitsAfter(2));
-    EXPECT_EQ(b.chain.device(2).userRegister(), 0xA5A5A5A5u);
-    EXPECT_EQ(b.chain.device(0).userRegister(), 0u);
-    const auto back = b.write(DR, bits(0, 32), 32, layout.bypassBitsBefore(2), layout.bypassBitsAfter(2));
-    EXPECT_EQ(value(back, 32), 0xA5A5A5A5u);
-
-    // Device 0's IR read-back shows its own capture, not its neighbours'.
-    const auto capture = b.write(IR, bits(0xE, 4), 4, layout.irBitsBefore(0), layout.irBitsAfter(0));
-    EXPECT_EQ(value(capture, 4), 0x1u);
-    EXPECT_EQ(b.chain.device(0).instruction(), 0xEu);
-    EXPECT_EQ(b.chain.device(2).instruction(), 0x3Fu);
-}
-
-TEST(SimModel, ExitStatesAreReachedAndShiftsContinue)
-{
-    Bench b({simtest::device(0x0362D093, 6, 0x09, 0x02, 32)});
-    b.write(IR, bits(0x02, 6), 6);
-    // Write 32 bits in two pieces: stay in Shift-DR, then go through Pause-DR.
-    b.write(DR, bits(0xBEEF, 16), 16, 0, 0, JEXJTAG_SHIFT_DR);
-    EXPECT_EQ(b.engine.state(), JEXJTAG_SHIFT_DR);
-    b.write(DR, bits(0x1234, 16), 16, 0, 0, JEXJTAG_PAUSE_DR);
-    EXPECT_EQ(b.engine.state(), JEXJTAG_PAUSE_DR);
-    EXPECT_EQ(b.chain.device(0).state(), JEXJTAG_PAUSE_DR);
-    b.engine.moveTo(JEXJTAG_UPDATE_DR);
-    EXPECT_EQ(b.chain.device(0).userRegister(), 0x1234BEEFu);
 }
 
 TEST(SimModel, TdoIsReleasedOutsideShiftStatesAndAWireChainPassesTdi)

@@ -2,7 +2,7 @@
 #include <gtest/gtest.h>
 
 #include "ChainSpec.hpp"
-#include "PluginArgs.hpp"
+#include "jexjtag/cable/PluginArgs.hpp"
 #include "SimOptions.hpp"
 
 using jexcable::PluginArgs;

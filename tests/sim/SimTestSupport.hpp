@@ -9,7 +9,7 @@
 
 #include "jexjtag/plugin.hpp"
 
-#include "BitBuffer.hpp"
+#include "jexjtag/cable/BitBuffer.hpp"
 #include "DeviceSpec.hpp"
 
 namespace simtest {

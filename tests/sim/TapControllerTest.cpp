@@ -4,7 +4,7 @@
 #include <array>
 #include <queue>
 
-#include "TapController.hpp"
+#include "jexjtag/cable/TapController.hpp"
 
 using jexcable::TapController;
 
@@ -86,35 +86,3 @@ TEST(TapController, PathsAreShortestAndArrive)
     }
 }
 
-TEST(TapController, WellKnownPaths)
-{
-    auto tms = [](JexJtagTapState a, JexJtagTapState b) {
-        const TapController::Path p = TapController::path(a, b);
-        std::string text;
-        for (unsigned i = 0; i < p.length; ++i) text += p.tmsAt(i) ? '1' : '0';
-        return text;
-    };
-    EXPECT_EQ(tms(JEXJTAG_RUN_TEST_IDLE, JEXJTAG_SHIFT_DR), "100");
-    EXPECT_EQ(tms(JEXJTAG_RUN_TEST_IDLE, JEXJTAG_SHIFT_IR), "1100");
-    EXPECT_EQ(tms(JEXJTAG_TEST_LOGIC_RESET, JEXJTAG_SHIFT_IR), "01100");
-    EXPECT_EQ(tms(JEXJTAG_EXIT1_DR, JEXJTAG_RUN_TEST_IDLE), "10");
-    EXPECT_EQ(tms(JEXJTAG_PAUSE_DR, JEXJTAG_SHIFT_DR), "10"); // resumes without a new Capture
-    EXPECT_EQ(tms(JEXJTAG_SHIFT_DR, JEXJTAG_SHIFT_IR), "111100");
-    EXPECT_EQ(tms(JEXJTAG_RUN_TEST_IDLE, JEXJTAG_TEST_LOGIC_RESET), "111");
-    EXPECT_EQ(tms(JEXJTAG_SHIFT_IR, JEXJTAG_SHIFT_IR), "");
-}
-
-TEST(TapController, StableStatesAndNames)
-{
-    int stable = 0;
-    for (int s = 0; s < 16; ++s) {
-        if (!TapController::isStable(S(s))) continue;
-        ++stable;
-        const bool tms = TapController::holdingTms(S(s));
-        EXPECT_EQ(TapController::next(S(s), tms), S(s)) << TapController::name(s);
-    }
-    EXPECT_EQ(stable, 6);
-    EXPECT_STREQ(TapController::name(JEXJTAG_UPDATE_IR), "Update-IR");
-    EXPECT_STREQ(TapController::name(16), "?");
-    EXPECT_FALSE(TapController::isValid(JEXJTAG_STATE_SIZE));
-}

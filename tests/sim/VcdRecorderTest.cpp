@@ -3,7 +3,7 @@
 
 #include <map>
 
-#include "JtagEngine.hpp"
+#include "jexjtag/cable/JtagEngine.hpp"
 #include "SimChain.hpp"
 #include "SimTestSupport.hpp"
 #include "VcdFile.hpp"

@@ -12,6 +12,7 @@ namespace jexjtag::cli {
     X(bsdl)                 \
     X(shift)                \
     X(info)                 \
+    X(serve)                \
     X(help)
 
 #define JEXJTAG_DECLARE_COMMAND(name) extern const Command name##Command;

@@ -30,7 +30,12 @@ public:
         if (!m_bits) return m_level;
         return BitBuffer::get(m_bits, offset) && (!m_mask || BitBuffer::get(m_mask, offset));
     }
+    // True for level(): every bit is level().
     bool isConstant() const { return m_bits == nullptr; }
+    bool level() const { return m_level; }
+    // The buffer and the mask (null for a constant level, or no mask).
+    const uint8_t* bits() const { return m_bits; }
+    const uint8_t* mask() const { return m_mask; }
 
 private:
     ShiftSource(const uint8_t* bits, const uint8_t* mask, bool high) : m_bits(bits), m_mask(mask), m_level(high) {}

@@ -27,6 +27,12 @@ public:
     static bool equalsIgnoreCase(const std::string& a, const std::string& b);
     static std::string toLower(std::string text);
     static std::string trim(const std::string& text);
+    // A frequency in Hz: decimal digits with an optional k (1000) or M
+    // (1000000) suffix, 1 Hz to maxHz.  False (hz untouched) otherwise.
+    static bool parseFrequency(const std::string& text, uint64_t maxHz, uint64_t& hz);
+    // 1/true/yes/on or 0/false/no/off, in any case.  False (flag untouched)
+    // otherwise.
+    static bool parseFlag(const std::string& text, bool& flag);
 
 private:
     std::vector<std::pair<std::string, std::string>> m_entries;
