@@ -56,7 +56,7 @@ echo "=== jexjtag scan"
 "$root/fs/usr/bin/jexjtag" scan | tee "$root/scan.txt"
 grep -q "0x0362D093" "$root/scan.txt" || fail "jexjtag scan did not read the simulated chain"
 (. "$root/fs/usr/share/bash-completion/completions/jexjtag"; PATH="$root/fs/usr/bin:$PATH"
- COMP_WORDS=(jexjtag s); COMP_CWORD=1; _jexjtag; [ "${COMPREPLY[*]}" = "scan shift" ]) || fail "bash completion"
+ COMP_WORDS=(jexjtag sc); COMP_CWORD=1; _jexjtag; [ "${COMPREPLY[*]}" = "scan" ]) || fail "bash completion"
 
 echo "=== python3 -c 'import jexjtag'"
 PYTHONPATH="$root/fs/usr/lib/python3/dist-packages" python3 - <<'PY'
