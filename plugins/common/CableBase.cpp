@@ -93,7 +93,13 @@ uint32_t CableBase::openTarget(uint32_t argc, const char** argv, JexJtagCallCont
     m_layout.assign({});
     m_transport = nullptr;
     m_engine.reset();
-    if (openCable(PluginArgs(argc, argv)) != JEX_SUCCESS) {
+    uint32_t opened = JEX_FAILURE;
+    try {
+        opened = openCable(PluginArgs(argc, argv));
+    } catch (const std::exception& e) {
+        opened = fail(e.what());
+    }
+    if (opened != JEX_SUCCESS) {
         m_engine.reset();
         m_transport = nullptr;
         return JEX_FAILURE;
@@ -439,6 +445,8 @@ uint32_t CableBase::pulsePin(uint32_t pin, uint32_t count)
     if (!requireOpen()) return JEX_FAILURE;
     if (pin == JEXJTAG_TDO) return fail("TDO is an input of the cable and cannot be pulsed");
     bool current = false;
+    if (count == 0 && pin > JEXJTAG_TCK && m_ownPins.count(pin) == 0 && !m_transport->readPin(pin, current))
+        return fail("unknown pin " + std::to_string(pin));
     switch (pin) {
     case JEXJTAG_TCK: current = m_tck; break;
     case JEXJTAG_TMS: current = m_tms; break;
@@ -502,7 +510,13 @@ uint32_t CableBase::sendCommand(const char* command, const uint8_t* inBuffer, ui
     if (PluginArgs::equalsIgnoreCase(command, "get")) {
         const std::string key = PluginArgs::toLower(PluginArgs::trim(input));
         std::string value;
-        switch (getOption(key, value)) {
+        OptionStatus answer = OptionStatus::Failed;
+        try {
+            answer = getOption(key, value);
+        } catch (const std::exception& e) {
+            fail(e.what());
+        }
+        switch (answer) {
         case OptionStatus::Failed: return JEX_FAILURE;
         case OptionStatus::Done: break;
         case OptionStatus::Unknown: {
@@ -522,7 +536,13 @@ uint32_t CableBase::sendCommand(const char* command, const uint8_t* inBuffer, ui
         bool known = false;
         const uint32_t common = setCommonOption(key, value, known);
         if (known) return common;
-        switch (setOption(key, value)) {
+        OptionStatus answer = OptionStatus::Failed;
+        try {
+            answer = setOption(key, value);
+        } catch (const std::exception& e) {
+            fail(e.what());
+        }
+        switch (answer) {
         case OptionStatus::Failed: return JEX_FAILURE;
         case OptionStatus::Done: return JEX_SUCCESS;
         case OptionStatus::Unknown: break;

@@ -2,11 +2,11 @@
 
 namespace jexcable {
 
-void JtagEngine::movePath(TapController::Path path)
+void JtagEngine::movePath(TapController::Path path, JexJtagTapState to)
 {
     if (path.length == 0) return;
     m_transport->moveTms(&path.tms, path.length, true);
-    for (unsigned i = 0; i < path.length; ++i) m_tap.clock(path.tmsAt(i));
+    m_tap.setState(to);
     m_clocks += path.length;
     m_lastTms = path.tmsAt(path.length - 1u);
     m_lastTdi = true;
@@ -26,7 +26,7 @@ void JtagEngine::resetTap()
 void JtagEngine::moveTo(JexJtagTapState state)
 {
     if (!m_stateKnown) resetTap();
-    movePath(TapController::path(m_tap.state(), state));
+    movePath(TapController::path(m_tap.state(), state), state);
 }
 
 bool JtagEngine::holdClocks(uint32_t count)

@@ -9,26 +9,6 @@ namespace {
 using S = JexJtagTapState;
 constexpr unsigned kStates = JEXJTAG_STATE_SIZE;
 
-// kNext[state][tms], IEEE 1149.1 figure 6-1.
-constexpr S kNext[kStates][2] = {
-    /* TEST_LOGIC_RESET */ {JEXJTAG_RUN_TEST_IDLE, JEXJTAG_TEST_LOGIC_RESET},
-    /* RUN_TEST_IDLE    */ {JEXJTAG_RUN_TEST_IDLE, JEXJTAG_SELECT_DR_SCAN},
-    /* SELECT_DR_SCAN   */ {JEXJTAG_CAPTURE_DR, JEXJTAG_SELECT_IR_SCAN},
-    /* CAPTURE_DR       */ {JEXJTAG_SHIFT_DR, JEXJTAG_EXIT1_DR},
-    /* SHIFT_DR         */ {JEXJTAG_SHIFT_DR, JEXJTAG_EXIT1_DR},
-    /* EXIT1_DR         */ {JEXJTAG_PAUSE_DR, JEXJTAG_UPDATE_DR},
-    /* PAUSE_DR         */ {JEXJTAG_PAUSE_DR, JEXJTAG_EXIT2_DR},
-    /* EXIT2_DR         */ {JEXJTAG_SHIFT_DR, JEXJTAG_UPDATE_DR},
-    /* UPDATE_DR        */ {JEXJTAG_RUN_TEST_IDLE, JEXJTAG_SELECT_DR_SCAN},
-    /* SELECT_IR_SCAN   */ {JEXJTAG_CAPTURE_IR, JEXJTAG_TEST_LOGIC_RESET},
-    /* CAPTURE_IR       */ {JEXJTAG_SHIFT_IR, JEXJTAG_EXIT1_IR},
-    /* SHIFT_IR         */ {JEXJTAG_SHIFT_IR, JEXJTAG_EXIT1_IR},
-    /* EXIT1_IR         */ {JEXJTAG_PAUSE_IR, JEXJTAG_UPDATE_IR},
-    /* PAUSE_IR         */ {JEXJTAG_PAUSE_IR, JEXJTAG_EXIT2_IR},
-    /* EXIT2_IR         */ {JEXJTAG_SHIFT_IR, JEXJTAG_UPDATE_IR},
-    /* UPDATE_IR        */ {JEXJTAG_RUN_TEST_IDLE, JEXJTAG_SELECT_DR_SCAN},
-};
-
 constexpr const char* kNames[kStates] = {
     "Test-Logic-Reset", "Run-Test/Idle", "Select-DR-Scan", "Capture-DR", "Shift-DR", "Exit1-DR",
     "Pause-DR",         "Exit2-DR",      "Update-DR",      "Select-IR-Scan", "Capture-IR", "Shift-IR",
@@ -51,7 +31,7 @@ PathTable buildPaths()
         while (head < tail) {
             const unsigned s = queue[head++];
             for (unsigned tms = 0; tms < 2; ++tms) {
-                const unsigned n = kNext[s][tms];
+                const unsigned n = TapController::next(static_cast<S>(s), tms != 0);
                 if (seen[n]) continue;
                 seen[n] = true;
                 TapController::Path p = table[from][s];
@@ -66,11 +46,6 @@ PathTable buildPaths()
 }
 
 } // namespace
-
-JexJtagTapState TapController::next(JexJtagTapState state, bool tms)
-{
-    return kNext[static_cast<unsigned>(state) % kStates][tms ? 1 : 0];
-}
 
 TapController::Path TapController::path(JexJtagTapState from, JexJtagTapState to)
 {

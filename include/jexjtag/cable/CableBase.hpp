@@ -33,7 +33,8 @@
 //  - Errors: every failure sends "<name>: <text>" to the session as an
 //    error message and logs it; an exception from the transport
 //    (std::runtime_error) becomes such a failure, and the TAP is reset
-//    before the next operation.
+//    before the next operation; so does an exception from openCable or the
+//    option hooks.
 //
 // The operations stay virtual: a cable may override one (calling the base)
 // to add to it.  Everything here runs on the caller's thread; an instance is

@@ -69,7 +69,7 @@ public:
     bool lastTdi() const { return m_lastTdi; }
 
 private:
-    void movePath(TapController::Path path);
+    void movePath(TapController::Path path, JexJtagTapState to);
     void padding(uint64_t bits, bool last);
     void transportShift(const ShiftSource& in, const ShiftSink& out, uint32_t count, bool tmsOnLast);
 

@@ -68,8 +68,10 @@ public:
     // default accepts TDI, TMS and TCK (whose levels CableBase keeps) and
     // refuses the rest.
     virtual bool drivePin(uint32_t pin, bool level);
-    // Reads a pin now: JEXJTAG_TDO or one of the cable's own pins.  False
-    // when it cannot be read (the default for every pin).
+    // Reads a pin after everything queued (a queueing transport flushes
+    // first): JEXJTAG_TDO or one of the cable's own pins.  False when it
+    // cannot be read (the default for every pin).  Levels are driven in
+    // queue order too.
     virtual bool readPin(uint32_t pin, bool& level);
 
     // Whether the cable has TRST and SRST lines (then CableBase offers the

@@ -32,7 +32,15 @@ public:
         return m_state;
     }
 
-    static JexJtagTapState next(JexJtagTapState state, bool tms);
+    static JexJtagTapState next(JexJtagTapState state, bool tms)
+    {
+        // [state][tms], IEEE 1149.1 figure 6-1, in JexJtagTapState order.
+        static constexpr uint8_t kNext[16][2] = {
+            {1, 0},   {1, 2},   {3, 9},  {4, 5},  {4, 5},  {6, 8},  {6, 7},  {4, 8},
+            {1, 2},   {10, 0},  {11, 12}, {11, 12}, {13, 15}, {13, 14}, {11, 15}, {1, 2},
+        };
+        return static_cast<JexJtagTapState>(kNext[static_cast<unsigned>(state) & 15u][tms ? 1 : 0]);
+    }
     // The shortest TMS sequence from one state to another (empty when equal).
     // Among sequences of the same length the one whose first differing TMS is
     // 0 is chosen.  No shortest path is longer than 8 clocks.
