@@ -7,6 +7,7 @@
 //   OpenOcd*  OpenOCD's own remote_bitbang client on the same server, timed
 //             inside OpenOCD with its `ms` command
 //   ServeOpenOcd  `jexjtag serve` (jtag_sim behind it) with OpenOCD as client
+//   ServeClient   the same with our client
 // Workloads: one 1 Mbit read-write DR scan, and 1,000 back-to-back 32-bit
 // read-write DR scans.  Figures: "bits/s" of scanned bits per second.
 #include <benchmark/benchmark.h>
@@ -109,13 +110,13 @@ void printProblem(unsigned, unsigned type, const char* text)
 
 class ClientSession {
 public:
-    ClientSession()
+    explicit ClientSession(const std::string& serverPortNumber = serverPort())
     {
         setenv("JEXJTAG_PLUGIN_DIR", JEXJTAG_TEST_BUILD_DIR "/lib/plugins", 1);
         setenv("JEXJTAG_DATA_DIR", JEXJTAG_TEST_BUILD_DIR "/share/jexjtag", 1);
         const char* sessionArgs[] = {"unloadtargetsondestroy=false"};
         if (JexJtag_session_create(printProblem, 1, sessionArgs, &m_handle) != JEX_SUCCESS) fail("session_create");
-        const std::string port = "port=" + serverPort();
+        const std::string port = "port=" + serverPortNumber;
         const char* argv[] = {"host=127.0.0.1", port.c_str()};
         if (JexJtag_target_open(m_handle, "remote_bitbang", nullptr, 2, argv, nullptr) != JEX_SUCCESS)
             fail("target_open");
@@ -209,5 +210,18 @@ void BM_ServeOpenOcd_1MbitReadWrite(benchmark::State& state)
                   "drscan auto0.tap " + std::to_string(kLongBits) + " 0", kLongBits);
 }
 BENCHMARK(BM_ServeOpenOcd_1MbitReadWrite)->Unit(benchmark::kMillisecond)->UseManualTime()->Iterations(3);
+
+// The same server with our client: what serve and jtag_sim take when the
+// client is not the bottleneck.
+void BM_ServeClient_1MbitReadWrite(benchmark::State& state)
+{
+    ChildProcess serve({JEXJTAG_TEST_BUILD_DIR "/bin/jexjtag", "serve", "--no-lock"});
+    const std::string address = serve.listeningAddress();
+    ClientSession session(address.substr(address.rfind(':') + 1));
+    std::vector<uint8_t> tdi(kLongBits / 8, 0x5A), tdo(kLongBits / 8);
+    for (auto _ : state) shiftDR(session.handle(), kLongBits, tdi, tdo);
+    state.counters["bits/s"] = benchmark::Counter(double(kLongBits) * state.iterations(), benchmark::Counter::kIsRate);
+}
+BENCHMARK(BM_ServeClient_1MbitReadWrite)->Unit(benchmark::kMillisecond)->UseRealTime();
 
 } // namespace

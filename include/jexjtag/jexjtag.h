@@ -17,5 +17,6 @@
 #include "target.h"
 #include "tap.h"
 #include "db.h"
+#include "svf.h"
 
 #endif /* JEXJTAG_JEXJTAG_H */

@@ -155,6 +155,10 @@ TEST_F(NetTest, ClientReadsTheChainOfAnIndependentServerOverTcpAndUnixSockets)
         const std::string address = server.listeningAddress();
         ASSERT_EQ(JEX_SUCCESS, open("remote_bitbang", addressArgs(address)));
         expectChainWorks(1);
+        EXPECT_EQ(JEX_SUCCESS, JexJtag_target_setOption(m_handle, "trst", "1")); // 't' resets the TAPs
+        EXPECT_EQ(JEX_SUCCESS, JexJtag_target_setOption(m_handle, "trst", "0"));
+        EXPECT_EQ(JEX_SUCCESS, JexJtag_tap_interrogateChain(m_handle, 0));
+        EXPECT_EQ("01001011101000000000010001110111", idcode(0));
         EXPECT_EQ(JEX_SUCCESS, JexJtag_target_close(m_handle));
         EXPECT_EQ("", server.errorText()); // only letters of the original protocol were sent
         if (unixSocket) continue;
@@ -279,6 +283,13 @@ TEST_F(NetTest, ServeOutlivesAClientLeavingMidScanAndReleasesTheCableOnSigterm)
         EXPECT_EQ(expected.substr(0, 1), exchange(fd, "0R", 1)) << "bit " << bit;
         EXPECT_EQ(expected.substr(1, 1), exchange(fd, "4R", 1)) << "bit " << bit;
     }
+    ::close(fd);
+
+    // A request outside the protocol ends that client's connection.
+    fd = rawConnect(address);
+    EXPECT_EQ("", exchange(fd, "04X0R4", 1));
+    char byte = 0;
+    EXPECT_EQ(0, ::recv(fd, &byte, 1, MSG_DONTWAIT)); // closed, not merely silent
     ::close(fd);
 
     // To Shift-DR again, 40 read bits, and gone before the replies.

@@ -7,11 +7,13 @@ namespace jexjtag::cli {
 // the entry `nameCommand` that app/<Name>Command.cpp defines.
 #define JEXJTAG_COMMANDS(X) \
     X(targets)              \
+    X(cables)               \
     X(scan)                 \
     X(lookup)               \
     X(bsdl)                 \
     X(shift)                \
     X(info)                 \
+    X(svf)                  \
     X(serve)                \
     X(help)
 

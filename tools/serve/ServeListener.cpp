@@ -2,6 +2,8 @@
 #include "ServeListener.hpp"
 
 #include <arpa/inet.h>
+
+#include <algorithm>
 #include <cerrno>
 #include <cstring>
 #include <netdb.h>
@@ -155,6 +157,12 @@ bool ServeListener::accept()
 
 std::size_t ServeListener::receive(char* data, std::size_t size, std::string* why)
 {
+    if (!m_early.empty()) {
+        const std::size_t n = std::min(size, m_early.size());
+        std::memcpy(data, m_early.data(), n);
+        m_early.erase(0, n);
+        return n;
+    }
     for (;;) {
         if (!waitFor(m_client, POLLIN)) {
             *why = "the server is stopping";
@@ -170,25 +178,36 @@ std::size_t ServeListener::receive(char* data, std::size_t size, std::string* wh
 
 bool ServeListener::hasInput()
 {
+    if (!m_early.empty()) return true;
     pollfd fds = {m_client, POLLIN, 0};
     return ::poll(&fds, 1, 0) > 0 && (fds.revents & POLLIN) != 0;
 }
 
 bool ServeListener::send(const std::string& data)
 {
+    constexpr std::size_t kMaxEarly = std::size_t(16) << 20;
     std::size_t done = 0;
+    bool inputOpen = true;
     while (done < data.size()) {
         const ssize_t n = ::send(m_client, data.data() + done, data.size() - done, MSG_NOSIGNAL | MSG_DONTWAIT);
         if (n > 0) {
             done += static_cast<std::size_t>(n);
             continue;
         }
-        if (n < 0 && (errno == EINTR)) continue;
-        if (n < 0 && (errno == EAGAIN || errno == EWOULDBLOCK)) {
-            if (!waitFor(m_client, POLLOUT)) return false;
-            continue;
+        if (n < 0 && errno == EINTR) continue;
+        if (n < 0 && errno != EAGAIN && errno != EWOULDBLOCK) return false;
+        const bool readOn = inputOpen && m_early.size() < kMaxEarly;
+        pollfd fds[2] = {{m_client, static_cast<short>(POLLOUT | (readOn ? POLLIN : 0)), 0}, {m_stopFd, POLLIN, 0}};
+        const int ready = ::poll(fds, 2, -1);
+        if (ready < 0 && errno == EINTR) continue;
+        if (ready < 0 || fds[1].revents != 0) return false;
+        if (readOn && (fds[0].revents & POLLIN) != 0) {
+            char chunk[1 << 16];
+            const ssize_t got = ::recv(m_client, chunk, sizeof chunk, MSG_DONTWAIT);
+            if (got > 0) m_early.append(chunk, static_cast<std::size_t>(got));
+            // At the end of its input a client may still take the replies.
+            else if (got == 0 || (errno != EAGAIN && errno != EINTR)) inputOpen = false;
         }
-        return false;
     }
     return true;
 }
@@ -198,6 +217,7 @@ void ServeListener::dropClient()
     if (m_client >= 0) ::close(m_client);
     m_client = -1;
     m_peer.clear();
+    m_early.clear();
 }
 
 } // namespace jexjtag::serve

@@ -35,6 +35,9 @@ public:
     // True when the client has sent bytes that receive() would return now.
     bool hasInput();
     // Sends everything; false when the client has gone or a stop came.
+    // While the client does not take replies, its requests are read on and
+    // kept for receive() (up to 16 MiB), so that a client that writes
+    // everything before it reads does not stall both sides.
     bool send(const std::string& data);
     // Closes the client connection.
     void dropClient();
@@ -49,6 +52,7 @@ private:
     std::string m_address;
     std::string m_unixPath;
     std::string m_peer;
+    std::string m_early; // requests read while sending, not yet received
 };
 
 } // namespace jexjtag::serve
