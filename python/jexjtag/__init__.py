@@ -23,10 +23,11 @@ from ._library import api_version
 from .errors import JtagError
 from .records import BsdlEntity, Device, DeviceRecord
 from .session import Session
+from .svf import SvfError, SvfResult
 from .tapstate import TapState
 from .target import Target
 
 __version__ = "1.0.0"
 
 __all__ = ["Session", "Target", "Device", "DeviceRecord", "BsdlEntity", "TapState", "JtagError",
-           "api_version", "__version__"]
+           "SvfResult", "SvfError", "api_version", "__version__"]

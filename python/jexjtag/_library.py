@@ -84,6 +84,37 @@ PROTOTYPES = {
     "JexJtag_db_parseBSDLFile": [_u, _s, _s, _u, _pu, _s, _u, _s, _u],
 }
 
+# ---- SVF player ---------------------------------------------------------------------
+SvfProgressCallback = ctypes.CFUNCTYPE(ctypes.c_int, ctypes.c_void_p, ctypes.c_uint64, ctypes.c_uint64,
+                                       ctypes.c_uint64)
+
+
+class SvfOptions(ctypes.Structure):
+    """``JexJtagSvfOptions`` (32 bytes)."""
+
+    _fields_ = [("flags", ctypes.c_uint32), ("reserved", ctypes.c_uint32), ("maxFrequencyHz", ctypes.c_double),
+                ("progress", SvfProgressCallback), ("progressUser", ctypes.c_void_p)]
+
+
+class SvfResult(ctypes.Structure):
+    """``JexJtagSvfResult`` (104 bytes); the caller owns the four text buffers."""
+
+    _fields_ = [("statements", ctypes.c_uint64), ("checks", ctypes.c_uint64), ("mismatches", ctypes.c_uint64),
+                ("firstMismatchLine", ctypes.c_uint64), ("firstMismatchBit", ctypes.c_uint64),
+                ("errorLine", ctypes.c_uint64), ("outcome", ctypes.c_uint32), ("expectedSize", ctypes.c_uint32),
+                ("expected", ctypes.c_void_p), ("actualSize", ctypes.c_uint32), ("maskSize", ctypes.c_uint32),
+                ("actual", ctypes.c_void_p), ("mask", ctypes.c_void_p), ("messageSize", ctypes.c_uint32),
+                ("reserved", ctypes.c_uint32), ("message", ctypes.c_void_p)]
+
+
+assert ctypes.sizeof(SvfOptions) == 32 and ctypes.sizeof(SvfResult) == 104
+
+# Declared when the library has them (a library older than the SVF player lacks these).
+OPTIONAL_PROTOTYPES = {
+    "JexJtag_svf_initOptions": [ctypes.POINTER(SvfOptions)],
+    "JexJtag_svf_playFile": [_u, _s, ctypes.POINTER(SvfOptions), ctypes.POINTER(SvfResult)],
+}
+
 _lock = threading.Lock()
 _library: Optional[ctypes.CDLL] = None
 
@@ -110,7 +141,8 @@ def candidates() -> List[str]:
 
 
 def _declare(lib: ctypes.CDLL) -> None:
-    for name, argtypes in PROTOTYPES.items():
+    optional = {name: types for name, types in OPTIONAL_PROTOTYPES.items() if hasattr(lib, name)}
+    for name, argtypes in {**PROTOTYPES, **optional}.items():
         function = getattr(lib, name)
         function.argtypes = argtypes
         function.restype = ctypes.c_uint32

@@ -5,9 +5,11 @@ from __future__ import annotations
 
 import contextlib
 import ctypes
+import os
 from typing import TYPE_CHECKING, Any, Dict, Iterator, List, Optional, Union
 
 from . import _library as lib
+from . import svf
 from .errors import JtagError
 from .records import Device
 from .tapstate import TapState
@@ -195,3 +197,21 @@ class Target:
             self._call(f"JexJtag_tap_shiftDevice{register}", int(device), lib.JEXJTAG_SHIFT_READWRITE,
                        int(exit_state), None, bits, tdi, tdo, None, None)
         return int.from_bytes(bytes(tdo), "little") & ((1 << bits) - 1)
+
+    # ---- SVF -----------------------------------------------------------------------------
+    def play_svf(self, path: Union[str, "os.PathLike[str]"], *, keep_going: bool = False, dry_run: bool = False,
+                 max_frequency_hz: float = 0.0, progress: Optional[svf.SvfProgress] = None) -> svf.SvfResult:
+        """Plays an SVF file on this target and returns what it did (:class:`SvfResult`).
+
+        Play stops at the first TDO mismatch unless ``keep_going``;
+        ``dry_run`` checks the whole file without touching the cable;
+        ``max_frequency_hz`` caps TCK (0: the file's FREQUENCY only);
+        ``progress(bytes_done, bytes_total, statements_done)`` is called as
+        play goes on and cancels it by returning True.  A play that does not
+        pass raises :class:`SvfError`, whose ``result`` says how far it came
+        and why; an exception raised by ``progress`` cancels the play and is
+        raised again.  Take the cable lock first, as for any shift.
+        """
+        if self._session is None:
+            raise JtagError("the target is closed", function="JexJtag_svf_playFile")
+        return svf.play(self, path, keep_going, dry_run, max_frequency_hz, progress)

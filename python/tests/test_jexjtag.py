@@ -10,8 +10,8 @@ import jexjtag
 from jexjtag import JtagError, TapState
 
 CHAIN = [(0x4BA00477, 4), (0x0362D093, 6), (0x41111043, 8)]  # jtag_sim's default chain
-BSDL = os.path.join(os.path.dirname(os.path.abspath(__file__)), "..", "..", "tests", "bsdl", "data",
-                    "st_STM32U535_U545_UFBGA100.bsd")
+TESTS = os.path.join(os.path.dirname(os.path.abspath(__file__)), "..", "..", "tests")
+BSDL = os.path.join(TESTS, "bsdl", "data", "st_STM32U535_U545_UFBGA100.bsd")
 
 
 def test_reads_the_simulated_chain_and_shifts_idcodes():
@@ -74,3 +74,25 @@ def test_failures_raise_jtagerror_with_the_libraries_message(caplog, target_type
         assert errors[-1] in str(raised.value)
     with pytest.raises(JtagError, match="closed"):
         session.targets()
+
+
+@pytest.mark.parametrize("name, keep_going, outcome, checks, mismatches, line", [
+    ("good-chain-idcodes.svf", False, "passed", 3, 0, 0),
+    ("mismatch-idcode.svf", False, "mismatch", 2, 1, 10),
+    ("mismatch-idcode.svf", True, "mismatch", 4, 1, 10),
+    ("wrong-hex-digit.svf", False, "bad_file", 0, 0, 4),
+])
+def test_play_svf(name, keep_going, outcome, checks, mismatches, line):
+    seen = []
+    with jexjtag.Session() as session, session.open("jtag_sim", port=f"svf{os.getpid()}") as target, target.locked():
+        path = os.path.join(TESTS, "svf", "data", name)
+        if outcome == "passed":
+            result = target.play_svf(path, progress=lambda *p: seen.append(p))
+            assert seen and seen[-1][2] == result.statements
+        else:
+            with pytest.raises(jexjtag.SvfError) as raised:
+                target.play_svf(path, keep_going=keep_going)
+            result = raised.value.result
+            assert result.message in str(raised.value) and f":{line}:" in result.message
+        assert (result.outcome, result.checks, result.mismatches) == (outcome, checks, mismatches)
+        assert line in (result.first_mismatch_line, result.error_line)
