@@ -16,6 +16,19 @@ run_suite() {
   local n
   n=$(sed -n 's/.*tests passed, 0 tests failed out of \([0-9]*\).*/\1/p' "$dir/ctest.log")
   total=$((total + ${n:-0}))
+  # ctest runs one test per process; each GoogleTest binary must also pass
+  # when run whole, as a host process runs many sessions one after another.
+  echo "=== whole test binaries $(basename "$dir")"
+  local bin
+  for bin in "$dir"/tests/bin/*; do
+    [ -f "$bin" ] && [ -x "$bin" ] && grep -qa -- "--gtest_list_tests" "$bin" || continue
+    if ! (cd "$dir" && timeout 300 "$bin" > "$bin.whole.log" 2>&1); then
+      tail -n 40 "$bin.whole.log"
+      echo "FAILED when run whole: $bin"
+      exit 1
+    fi
+    total=$((total + 1))
+  done
 }
 
 run_suite "$here/build" -DCMAKE_BUILD_TYPE=RelWithDebInfo

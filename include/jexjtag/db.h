@@ -1,8 +1,9 @@
 /*
  * db.h - the session's device database and BSDL import.
  *
- * IDCODE texts are '0'/'1' characters, most significant bit first; a
- * shorter text counts as having leading zeros.
+ * IDCODE texts are 1 to 32 characters '0', '1', 'X' or 'x' (X: a bit that
+ * matches either value), most significant bit first; a shorter text counts
+ * as having leading zeros.  Any other text fails.
  */
 #ifndef JEXJTAG_DB_H
 #define JEXJTAG_DB_H
@@ -39,13 +40,17 @@ JEXJTAG_API uint32_t JexJtag_db_getBypassForIdcode(unsigned handle, const char* 
 
 /* Reads a BSDL text held in memory: entity name, instruction length, IDCODE
  * register text (empty when the device has none) and the first BYPASS
- * opcode.  Output buffers are zeroed first; texts are cut to size - 1. */
+ * opcode.  Output buffers are zeroed first; texts are cut to size - 1.
+ * Warnings and errors go to the host as messages that name filename.  A
+ * text larger than 64 MiB fails (nothing of it is copied). */
 JEXJTAG_API uint32_t JexJtag_db_parseBSDL(unsigned handle, const char* filename, const char* buf,
                                           unsigned bufLen, char* deviceName, unsigned deviceNameLen,
                                           unsigned* irlength, char* idcode, unsigned idcodeLen,
                                           char* cmd_bypass, unsigned bypassbufLen);
-/* The same for a BSDL file; a file that cannot be opened fails without
- * touching the outputs. */
+/* The same for a BSDL file, read once from its start without seeking (a pipe
+ * or FIFO works) and never beyond 64 MiB: a larger file fails.  A file that
+ * cannot be opened or read fails, with an error message, without touching
+ * the outputs. */
 JEXJTAG_API uint32_t JexJtag_db_parseBSDLFile(unsigned handle, const char* filename, char* deviceName,
                                               unsigned deviceNameLen, unsigned* irlength, char* idcode,
                                               unsigned idcodeLen, char* cmd_bypass, unsigned bypassbufLen);

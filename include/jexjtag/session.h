@@ -3,8 +3,16 @@
  *
  * A host creates a session first, passes its handle to every other call and
  * destroys it last.  Every function returns JEX_SUCCESS or JEX_FAILURE and
- * writes its results through out-parameters.  The library takes no lock:
- * call it from one thread at a time.
+ * writes its results through out-parameters.  Calls on different sessions
+ * may come from different threads at the same time; the calls on one
+ * session (and its target) must come from one thread at a time.
+ *
+ * A message callback may call back into the library, also to destroy its
+ * session, close its target or create sessions: what the running call uses
+ * stays alive until it returns, and such a teardown completes then.  Once
+ * destroyed, a session's handle reaches nothing and it gets no more
+ * messages.  Sessions may be destroyed from atexit handlers and global
+ * destructors.
  */
 #ifndef JEXJTAG_SESSION_H
 #define JEXJTAG_SESSION_H
@@ -20,11 +28,14 @@ JEXJTAG_BEGIN_DECLS
 JEXJTAG_API uint32_t JexJtag_session_getAPIVersion(unsigned* version, char* versionString,
                                                    unsigned versionLen);
 
-/* Creates a session and writes its handle (0x00010000, 0x00020000, ...).
- * argv holds argc "key=value" texts: "datadir=DIR" chooses the directory of
- * idcode.lst, "unloadtargetsondestroy=false" keeps plug-ins loaded after the
- * last session.  msgCallback may be null (messages then go to stdout).
- * On failure *handle is 0. */
+/* Creates a session and writes its handle (0x00010000, 0x00020000, ...,
+ * 0x00FF0000, then 0x00000000 for the 256th session, which is a valid
+ * handle, and round again, skipping ids still in use).  argv holds argc
+ * "key=value" texts: "datadir=DIR" chooses the directory of idcode.lst for
+ * the whole process, "unloadtargetsondestroy=false" keeps plug-ins loaded
+ * after the last session.  msgCallback may be null (messages then go to
+ * stdout).  On failure *handle is 0 too: tell failure by the status, never
+ * by the handle. */
 JEXJTAG_API uint32_t JexJtag_session_create(JexMessageCallback msgCallback, unsigned argc,
                                             const char** argv, unsigned* handle);
 

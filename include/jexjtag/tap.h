@@ -47,12 +47,14 @@ JEXJTAG_API uint32_t JexJtag_tap_setIRLength(unsigned handle, unsigned deviceInd
  * is cleared first, also when the call fails. */
 JEXJTAG_API uint32_t JexJtag_tap_getDeviceIdcode(unsigned handle, unsigned deviceIndex,
                                                  char* idcode, unsigned idcodeLen);
-/* Overrides the device's IDCODE, given as '0'/'1' text. */
+/* Overrides the device's IDCODE, given as 1 to 32 characters '0', '1', 'X'
+ * or 'x' (an X bit is stored as 0; a shorter text has leading zeros); any
+ * other text fails. */
 JEXJTAG_API uint32_t JexJtag_tap_setDeviceIdcode(unsigned handle, unsigned deviceIndex,
                                                  const char* idcode);
 
 /* Moves the TAP to newState with clockRepeat extra clocks there; with
- * microSeconds > 0 flushes and then sleeps microSeconds / 1000 ms. */
+ * microSeconds > 0 flushes and then waits at least microSeconds. */
 JEXJTAG_API uint32_t JexJtag_tap_navigate(unsigned handle, unsigned newState, unsigned clockRepeat,
                                           unsigned microSeconds);
 

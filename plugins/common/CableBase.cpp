@@ -55,12 +55,13 @@ void CableBase::attachTransport(JtagTransport& transport)
     m_engine = std::make_unique<JtagEngine>(transport);
 }
 
-bool CableBase::interrogateChain(std::string& error)
+bool CableBase::interrogateChain(std::string& error, bool& cableFailed)
 {
     ChainScanner::Result result;
     bool ok = false;
     const uint32_t status = run([&](JtagEngine& engine) { ok = ChainScanner(engine).scan(result); });
-    if (status != JEX_SUCCESS) {
+    cableFailed = status != JEX_SUCCESS;
+    if (cableFailed) {
         error = "the cable failed";
         return false;
     }
@@ -79,12 +80,16 @@ bool CableBase::interrogateChain(std::string& error)
     return true;
 }
 
-void CableBase::resetAndInterrogate()
+bool CableBase::resetAndInterrogate()
 {
     m_layout.assign({});
-    if (run([](JtagEngine& engine) { engine.resetTap(); }) != JEX_SUCCESS) return;
+    if (run([](JtagEngine& engine) { engine.resetTap(); }) != JEX_SUCCESS) return false;
     std::string error;
-    if (!interrogateChain(error)) warn("the chain cannot be interrogated: " + error);
+    bool cableFailed = false;
+    if (interrogateChain(error, cableFailed)) return true;
+    if (cableFailed) return false;
+    warn("the chain cannot be interrogated: " + error);
+    return true;
 }
 
 uint32_t CableBase::openTarget(uint32_t argc, const char** argv, JexJtagCallContext*)
@@ -110,7 +115,12 @@ uint32_t CableBase::openTarget(uint32_t argc, const char** argv, JexJtagCallCont
     }
     m_lock = std::make_unique<CableLock>(lockKey());
     m_open = true;
-    resetAndInterrogate();
+    // A cable that fails on its first clocks is not open: the host hears
+    // why, and nothing stays held.
+    if (!resetAndInterrogate()) {
+        closeTarget();
+        return JEX_FAILURE;
+    }
     return JEX_SUCCESS;
 }
 
@@ -133,7 +143,8 @@ uint32_t CableBase::interrogate()
 {
     if (!requireOpen()) return JEX_FAILURE;
     std::string error;
-    if (!interrogateChain(error)) return fail("chain interrogation failed: " + error);
+    bool cableFailed = false;
+    if (!interrogateChain(error, cableFailed)) return fail("chain interrogation failed: " + error);
     return JEX_SUCCESS;
 }
 

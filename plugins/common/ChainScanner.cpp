@@ -47,8 +47,12 @@ bool ChainScanner::scanIdcodes(Result& result)
 bool ChainScanner::scanIr(Result& result)
 {
     const uint32_t maxBits = m_limits.maxIrBits;
-    std::vector<uint8_t> captured(BitBuffer::bytesFor(maxBits), 0);
-    m_engine->shiftLevel(JtagEngine::Register::Instruction, false, captured.data(), maxBits, JEXJTAG_SHIFT_IR);
+    // Twice the limit: an IR longer than the limit still holds captured
+    // bits after the first half, and they show in the second.
+    std::vector<uint8_t> captured(BitBuffer::bytesFor(2 * maxBits), 0);
+    m_engine->shiftLevel(JtagEngine::Register::Instruction, false, captured.data(), 2 * maxBits, JEXJTAG_SHIFT_IR);
+    bool overlong = false;
+    for (uint32_t i = maxBits; i < 2 * maxBits && !overlong; ++i) overlong = BitBuffer::get(captured.data(), i);
 
     // The chain now holds zeros; feed ones until the first comes out.
     uint32_t length = 0;
@@ -67,8 +71,9 @@ bool ChainScanner::scanIr(Result& result)
     }
     // All devices now hold ones in their IR: BYPASS after Update-IR.
     m_engine->moveTo(JEXJTAG_UPDATE_IR);
-    if (!found || length > maxBits) {
-        result.error = "the instruction registers are longer than " + std::to_string(maxBits) + " bits";
+    if (overlong || !found || length > maxBits) {
+        result.error = "the instruction registers are longer than " + std::to_string(maxBits) +
+                       " bits, the most an interrogation reads";
         return false;
     }
     result.irCapture.resize(length);

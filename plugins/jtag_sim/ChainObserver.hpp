@@ -17,6 +17,10 @@ public:
     virtual void onPinLevel(const SimChain& chain, unsigned pin, bool level) = 0;
     // Time passing without clocks (waitTime).
     virtual void onWait(uint64_t microseconds) = 0;
+    // After the chain was driven: an observer that can no longer record
+    // throws std::runtime_error saying why, once, and records nothing more.
+    // `flushFirst`: hand buffered output on first (a flush or a wait).
+    virtual void checkRecorded(bool flushFirst) { (void)flushFirst; }
 };
 
 } // namespace jexsim

@@ -23,7 +23,10 @@ bool SimChain::clock(bool tms, bool tdi)
     ++m_cycles;
     m_lastTms = tms;
     m_lastTdi = tdi;
-    if (m_observer) m_observer->onClock(*this, tms, tdi, out);
+    if (m_observer) {
+        m_observer->onClock(*this, tms, tdi, out);
+        m_observer->checkRecorded(false);
+    }
     return out;
 }
 
@@ -43,7 +46,10 @@ bool SimChain::drivePin(uint32_t pin, bool level)
 {
     if (pin != JEXJTAG_TCK && pin != JEXJTAG_TMS && pin != JEXJTAG_TDI) return false;
     if (pin == JEXJTAG_TDI) m_lastTdi = level;
-    if (m_observer) m_observer->onPinLevel(*this, pin, level);
+    if (m_observer) {
+        m_observer->onPinLevel(*this, pin, level);
+        m_observer->checkRecorded(false);
+    }
     return true;
 }
 
@@ -56,8 +62,16 @@ bool SimChain::readPin(uint32_t pin, bool& level)
 
 void SimChain::sleep(uint32_t microseconds)
 {
-    if (m_observer) m_observer->onWait(microseconds);
+    if (m_observer) {
+        m_observer->onWait(microseconds);
+        m_observer->checkRecorded(true);
+    }
     jexcable::PluginPlatform::sleepMicroseconds(microseconds);
+}
+
+void SimChain::flush()
+{
+    if (m_observer) m_observer->checkRecorded(true);
 }
 
 void SimChain::shift(const jexcable::ShiftSource& in, const jexcable::ShiftSink& out, uint32_t count,

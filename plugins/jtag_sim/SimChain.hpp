@@ -47,6 +47,8 @@ public:
     // TDO only: the chain's output now.
     bool readPin(uint32_t pin, bool& level) override;
     void sleep(uint32_t microseconds) override;
+    // Nothing is queued; the observer hands its output on.
+    void flush() override;
 
 private:
     bool inShiftState() const;

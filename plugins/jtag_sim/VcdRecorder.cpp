@@ -1,5 +1,7 @@
 #include "VcdRecorder.hpp"
 
+#include <cerrno>
+#include <cstring>
 #include <ctime>
 #include <stdexcept>
 
@@ -75,12 +77,34 @@ VcdRecorder::VcdRecorder(const std::string& path, const SimChain& chain, uint64_
     m_stamped = 0;
 }
 
-VcdRecorder::~VcdRecorder()
+VcdRecorder::~VcdRecorder() { finish(); }
+
+bool VcdRecorder::finish()
 {
-    if (!m_file) return;
+    if (!m_file) return true;
     // A last time stamp, so viewers show the final half cycle.
     std::fprintf(m_file, "#%llu\n", static_cast<unsigned long long>(m_time));
+    const bool written = ok();
+    const bool closed = std::fclose(m_file) == 0;
+    m_file = nullptr;
+    return written && closed;
+}
+
+bool VcdRecorder::ok() const { return m_file && !std::ferror(m_file); }
+
+void VcdRecorder::checkRecorded(bool flushFirst)
+{
+    if (!m_file) return;
+    if (flushFirst) {
+        errno = 0;
+        std::fflush(m_file);
+    }
+    if (!std::ferror(m_file)) return;
+    const int error = errno;
     std::fclose(m_file);
+    m_file = nullptr;
+    throw std::runtime_error("writing the waveform to " + m_path + " failed (" +
+                             (error ? std::strerror(error) : "write error") + "); recording stopped");
 }
 
 void VcdRecorder::stamp()
@@ -111,6 +135,7 @@ void VcdRecorder::changeState(std::size_t device, unsigned state)
 
 void VcdRecorder::onClock(const SimChain& chain, bool tms, bool tdi, bool tdo)
 {
+    if (!m_file) return;
     change(kTck, false);
     change(kTms, tms);
     change(kTdi, tdi);
@@ -124,7 +149,7 @@ void VcdRecorder::onClock(const SimChain& chain, bool tms, bool tdi, bool tdo)
 void VcdRecorder::pinLevel(unsigned pin, bool level, const SimChain& chain)
 {
     static const unsigned kSignalOfPin[4] = {kTdi, kTdo, kTms, kTck}; // JexJtagPin order
-    if (pin >= 4) return;
+    if (pin >= 4 || !m_file) return;
     change(kSignalOfPin[pin], level);
     change(kTdo, chain.tdo(m_levels[kTdi]));
     m_time += m_halfPeriod;
@@ -140,9 +165,9 @@ void VcdRecorder::setFrequency(uint64_t frequencyHz)
     m_halfPeriod = halfPeriodPs(frequencyHz);
 }
 
-void VcdRecorder::flush()
+bool VcdRecorder::flush()
 {
-    std::fflush(m_file);
+    return m_file && std::fflush(m_file) == 0 && ok();
 }
 
 } // namespace jexsim

@@ -45,8 +45,16 @@ public:
     // Time passing without clocks.
     void wait(uint64_t microseconds);
     void setFrequency(uint64_t frequencyHz);
-    // Hands buffered output to the file.
-    void flush();
+    // Hands buffered output to the file.  False when a write to the file
+    // has failed, now or before (a full disk): the waveform is incomplete.
+    bool flush();
+    // False once a write to the file has failed.
+    bool ok() const;
+    // Writes the last time stamp and closes the file; false when anything
+    // could not be written.  The destructor does it when not done.
+    bool finish();
+    // Throws std::runtime_error when a write has failed, and closes the file.
+    void checkRecorded(bool flushFirst) override;
 
 private:
     void change(unsigned signal, bool level);

@@ -36,24 +36,6 @@ void copyCut(char* buf, unsigned size, const std::string& text)
 
 const char* shown(const char* text) { return text ? text : "NULL"; }
 
-// Reads the whole file into memory; false when it cannot be opened or read
-// in full, or is too large for a 32-bit length.
-bool readWholeFile(const std::string& path, std::unique_ptr<char[]>& data, unsigned& length)
-{
-    std::FILE* file = std::fopen(path.c_str(), "rb");
-    if (!file) return false;
-    std::unique_ptr<std::FILE, int (*)(std::FILE*)> closer(file, &std::fclose);
-    if (std::fseek(file, 0, SEEK_END) != 0) return false;
-    const long end = std::ftell(file);
-    if (std::fseek(file, 0, SEEK_SET) != 0) return false;
-    const long start = std::ftell(file);
-    if (end < 0 || start < 0 || static_cast<unsigned long>(end - start) > UINT_MAX) return false;
-    length = static_cast<unsigned>(end - start);
-    data.reset(new (std::nothrow) char[length ? length : 1]);
-    if (!data) return false;
-    return std::fread(data.get(), 1, length, file) == length;
-}
-
 } // namespace
 
 extern "C" {
@@ -108,14 +90,18 @@ JEXJTAG_API uint32_t JexJtag_db_parseBSDLFile(unsigned handle, const char* filen
                             handle, shown(filename), deviceNameLen, idcodeLen, bypassbufLen);
     const unsigned status = guardedCall("JexJtag_db_parseBSDLFile", [&]() -> unsigned {
         if (!filename) return JEX_FAILURE;
+        Session* session = findSession(handle);
+        if (!session) // clears the outputs, as for a text
+            return JexJtag_db_parseBSDL(handle, filename, nullptr, 0, deviceName, deviceNameLen, irlength, idcode,
+                                        idcodeLen, cmd_bypass, bypassbufLen);
         const std::string path = Jex_Util::trimWhitespace(filename);
-        std::unique_ptr<char[]> data;
-        unsigned length = 0;
-        if (!readWholeFile(path, data, length)) return JEX_FAILURE;
-        const unsigned result = JexJtag_db_parseBSDL(handle, path.c_str(), data.get(), length, deviceName,
-                                                     deviceNameLen, irlength, idcode, idcodeLen, cmd_bypass,
-                                                     bypassbufLen);
-        data.reset();
+        // Read once, within the size limit, before anything is copied.
+        std::string data;
+        if (JEX_FAILED(session->readBSDLFile(path, data))) return JEX_FAILURE;
+        const unsigned result = JexJtag_db_parseBSDL(handle, path.c_str(), data.data(),
+                                                     static_cast<unsigned>(data.size()), deviceName, deviceNameLen,
+                                                     irlength, idcode, idcodeLen, cmd_bypass, bypassbufLen);
+        std::string().swap(data);
         if (!JEX_FAILED(result) && deviceName && irlength && idcode && cmd_bypass)
             Logger::logger.printLog(3,
                                     "JexJtag_db_parseBSDLFile() returning deviceName=%s, irlength=%u, idcode=%s, "

@@ -7,6 +7,7 @@
 #include <string>
 
 #include "api/ApiGuard.hpp"
+#include "api/IdcodeText.hpp"
 #include "jexjtag/db.h"
 #include "jexjtag/rt/Devices.hpp"
 #include "jexjtag/rt/IDCode.hpp"
@@ -58,6 +59,7 @@ unsigned idcodeLookup(unsigned handle, const std::string& idcode, std::string& d
                       unsigned* familyType, unsigned* familySubType, std::string& bypass, bool* isUserList)
 {
     return guardedCall("JexRT::idcodeLookup", [&]() -> unsigned {
+        if (!isIdcodeText(idcode.c_str()) || idcode.size() != std::strlen(idcode.c_str())) return JEX_FAILURE;
         return lookup(handle, IDCode(idcode), deviceName, irLength, familyType, familySubType, bypass,
                       isUserList);
     });

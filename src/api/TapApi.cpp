@@ -6,6 +6,7 @@
 #include <string>
 
 #include "api/ApiGuard.hpp"
+#include "api/IdcodeText.hpp"
 #include "jexjtag/rt/IDCode.hpp"
 #include "jexjtag/tap.h"
 #include "session/SessionRegistry.hpp"
@@ -272,7 +273,7 @@ JEXJTAG_API uint32_t JexJtag_tap_setDeviceIdcode(unsigned handle, unsigned devic
                             deviceIndex, idcode ? idcode : "NULL");
     const unsigned status = guardedCall("JexJtag_tap_setDeviceIdcode", [&]() -> unsigned {
         Target* target = findTarget(handle);
-        if (!target || !idcode) return JEX_FAILURE;
+        if (!target || !isIdcodeText(idcode)) return JEX_FAILURE;
         return target->setDeviceIdcode(deviceIndex, IDCode(std::string(idcode)));
     });
     return tracer.setReturnStatus(status);

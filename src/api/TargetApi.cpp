@@ -99,6 +99,9 @@ JEXJTAG_API uint32_t JexJtag_target_open(unsigned handle, const char* targetName
         args.push_back(std::string("type=") + targetName);
         JexJtagCallContext context{handle, 0, callerData};
         const unsigned result = target->open(targetName, &context, args);
+        // A callback may have closed the target or destroyed the session
+        // meanwhile: only the target still in the slot is touched.
+        if (session->getTarget(index) != target) return JEX_FAILED(result) ? result : JEX_FAILURE;
         if (JEX_FAILED(result)) {
             // Also when a target was open already: it is closed with its object.
             session->destroyTarget(index);
@@ -129,8 +132,16 @@ JEXJTAG_API uint32_t JexJtag_target_close(unsigned handle)
     const unsigned status = guardedCall("JexJtag_target_close", [&]() -> unsigned {
         Target* target = findTarget(handle);
         if (!target) return JEX_FAILURE;
+        Session* session = findSession(handle);
+        const unsigned index = handle & JEX_HANDLE_TARGET_MASK;
+        // From a callback the target may be in the middle of a call: it
+        // leaves the slot now and is closed when that call returns.
+        if (ApiCallScope::nested()) {
+            session->destroyTarget(index);
+            return JEX_SUCCESS;
+        }
         const unsigned result = target->close();
-        findSession(handle)->destroyTarget(handle & JEX_HANDLE_TARGET_MASK);
+        if (session->getTarget(index) == target) session->destroyTarget(index);
         return result;
     });
     return tracer.setReturnStatus(status);

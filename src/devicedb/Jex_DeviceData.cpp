@@ -18,6 +18,7 @@ namespace {
 
 constexpr size_t kReservedEntries = 300;
 constexpr size_t kPatternLength = static_cast<size_t>(Jex_OneDeviceData::IDCODE_BIT_LEN);
+constexpr int kMaxIRLength = 4096;
 
 // White space as the C locale's isspace sees it, whatever the global locale.
 bool isSpace(char c) { return c == ' ' || c == '\t' || c == '\n' || c == '\v' || c == '\f' || c == '\r'; }
@@ -99,6 +100,8 @@ Jex_OneDeviceData* Jex_DeviceData::readInEntry(const char* fileName, int lineNum
     if (pattern.size() != kPatternLength || nameLength < 2) throwLogicError(fileName, lineNumber, "bad data.");
     for (const NumberField& field : fields)
         if (field.empty || field.tooLarge) throwLogicError(fileName, lineNumber, "bad data.");
+    // No device has a longer instruction register (the BSDL reader's limit too).
+    if (fields[0].value > kMaxIRLength) throwLogicError(fileName, lineNumber, "bad data.");
 
     return new Jex_OneDeviceData(pattern, line.substr(nameStart, nameLength), fields[0].value, fields[1].value,
                                  fields[2].value, userEntry);
@@ -106,8 +109,17 @@ Jex_OneDeviceData* Jex_DeviceData::readInEntry(const char* fileName, int lineNum
 
 bool Jex_DeviceData::entryCompare(const Jex_OneDeviceData* a, const Jex_OneDeviceData* b)
 {
-    const int order = a->getMatchText().compare(b->getMatchText());
-    if (order != 0) return order < 0;
+    // Byte order of the patterns, with 'x' taken as 'X': the two spellings
+    // of a don't-care bit are the same pattern.
+    const std::string& ta = a->getMatchText();
+    const std::string& tb = b->getMatchText();
+    const size_t n = std::min(ta.size(), tb.size());
+    for (size_t i = 0; i < n; ++i) {
+        const char ca = ta[i] == 'x' ? 'X' : ta[i];
+        const char cb = tb[i] == 'x' ? 'X' : tb[i];
+        if (ca != cb) return static_cast<unsigned char>(ca) < static_cast<unsigned char>(cb);
+    }
+    if (ta.size() != tb.size()) return ta.size() < tb.size();
     return a->isUserEntry() && !b->isUserEntry();
 }
 
@@ -120,7 +132,8 @@ void Jex_DeviceData::sortEntries()
         return entryCompare(a.get(), b.get());
     };
     const auto middle = m_entries.begin() + static_cast<std::ptrdiff_t>(m_sortedCount);
-    std::sort(middle, m_entries.end(), less);
+    // Stable: entries of identical text keep the order they were read in.
+    std::stable_sort(middle, m_entries.end(), less);
     std::inplace_merge(m_entries.begin(), middle, m_entries.end(), less);
     m_sortedCount = m_entries.size();
 }
@@ -129,10 +142,15 @@ void Jex_DeviceData::addEntriesFromFile(const char* fileName, std::istream& in, 
 {
     std::string line;
     int lineNumber = 0;
-    while (std::getline(in, line)) {
-        std::unique_ptr<Jex_OneDeviceData> entry(readInEntry(fileName, lineNumber, line, userEntry));
-        if (entry) m_entries.push_back(std::move(entry));
-        if (lineNumber < INT_MAX) ++lineNumber;
+    try {
+        while (std::getline(in, line)) {
+            std::unique_ptr<Jex_OneDeviceData> entry(readInEntry(fileName, lineNumber, line, userEntry));
+            if (entry) m_entries.push_back(std::move(entry));
+            if (lineNumber < INT_MAX) ++lineNumber;
+        }
+    } catch (...) {
+        sortEntries(); // the entries kept before a bad line take part in lookups
+        throw;
     }
     sortEntries();
 }

@@ -37,6 +37,7 @@ unsigned PluginManager::addAllPlugins()
 {
     MethodLogger tracer;
     tracer.setMethodName("PluginManager::addAllPlugins");
+    std::lock_guard<std::recursive_mutex> lock(m_mutex);
     unsigned status = JEX_FAILURE;
     const std::string root = m_pluginRoot;
 

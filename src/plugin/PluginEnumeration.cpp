@@ -28,6 +28,7 @@ unsigned PluginManager::getTargetCount()
 {
     MethodLogger tracer;
     tracer.setMethodName("PluginManager::getTargetCount");
+    std::lock_guard<std::recursive_mutex> lock(m_mutex);
     const unsigned count = static_cast<unsigned>(m_targetTypes.size());
     tracer.setReturn(count);
     return count;
@@ -57,6 +58,7 @@ unsigned PluginManager::getXMLSizeByIndex(unsigned index)
 {
     MethodLogger tracer;
     tracer.setMethodName("PluginManager::getXMLSizeByIndex");
+    std::lock_guard<std::recursive_mutex> lock(m_mutex);
     tracer.setReturn(0);
     if (index >= getTargetCount()) {
         Logger::logger.printLog(1, "PluginManager::getXMLSizeByIndex() - Invalid argument\n");
@@ -81,6 +83,7 @@ unsigned PluginManager::getTargetByIndex(unsigned index, char* xmlBuf, unsigned 
 {
     MethodLogger tracer;
     tracer.setMethodName("PluginManager::getTargetByIndex");
+    std::lock_guard<std::recursive_mutex> lock(m_mutex);
     if (index >= getTargetCount() || !xmlBuf || xmlBufLen == 0 || !targetName || !pluginName) {
         Logger::logger.printLog(1, "PluginManager::getTargetByIndex() - Invalid argument\n");
         return tracer.setReturnStatus(JEX_FAILURE);

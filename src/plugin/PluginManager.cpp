@@ -96,6 +96,7 @@ void PluginManager::removeAllPlugins()
 {
     MethodLogger tracer;
     tracer.setMethodName("PluginManager::removeAllPlugins");
+    std::lock_guard<std::recursive_mutex> lock(m_mutex);
     // The views in the tables point into the records: clear them first.
     m_targetTypes.clear();
     m_typeToKey.clear();
@@ -123,12 +124,15 @@ PluginModule* PluginManager::moduleFor(const std::string& type, const char* who)
     return plugin->second;
 }
 
-JexPluginInstance* PluginManager::createPluginInstance(std::string type)
+JexPluginInstance* PluginManager::createPluginInstance(std::string type, const PluginModule** creator)
 {
     MethodLogger tracer;
     tracer.setMethodName("PluginManager::createPluginInstance");
+    std::lock_guard<std::recursive_mutex> lock(m_mutex);
+    if (creator) *creator = nullptr;
     PluginModule* module = moduleFor(type, "createPluginInstance");
     if (!module || !module->create) return nullptr;
+    if (creator) *creator = module;
     return module->create();
 }
 
@@ -136,9 +140,18 @@ void PluginManager::destroyPluginInstance(std::string type, JexPluginInstance* i
 {
     MethodLogger tracer;
     tracer.setMethodName("PluginManager::destroyPluginInstance");
+    std::lock_guard<std::recursive_mutex> lock(m_mutex);
     PluginModule* module = moduleFor(type, "destroyPluginInstance");
     if (!module || !module->destroy) return;
     module->destroy(instance);
+}
+
+void PluginManager::destroyPluginInstance(const PluginModule* creator, JexPluginInstance* instance)
+{
+    MethodLogger tracer;
+    tracer.setMethodName("PluginManager::destroyPluginInstance");
+    std::lock_guard<std::recursive_mutex> lock(m_mutex);
+    if (creator && creator->destroy) creator->destroy(instance);
 }
 
 } // namespace JexRT

@@ -4,13 +4,15 @@
 // It walks the plug-in tree (<root>/<company>/<P>/P.xml and P.so), loads
 // every plug-in whose descriptor is accepted, keeps the tables that map a
 // target type to the module serving it, lists the targets for hosts, and
-// creates and destroys plug-in instances for the target layer.  Discovery
+// creates and destroys plug-in instances for the target layer.  Safe to
+// use from several threads.  Discovery
 // only adds; modules are unloaded together when the manager is destroyed.
 //
 // The tables hold views into strings of the module records the manager
 // owns; a record never changes while it is in the tables.
 
 #include <memory>
+#include <mutex>
 #include <string>
 #include <string_view>
 #include <unordered_map>
@@ -44,10 +46,15 @@ public:
     void removeAllPlugins();
 
     // A new instance from the module serving `type` (JexPlugin_create's
-    // result, null included); null when no module serves it.
-    JexPluginInstance* createPluginInstance(std::string type);
+    // result, null included); null when no module serves it.  *creator,
+    // when given, is set to that module (null when none).
+    JexPluginInstance* createPluginInstance(std::string type, const PluginModule** creator = nullptr);
     // Gives an instance back to the module serving `type` (JexPlugin_destroy).
     void destroyPluginInstance(std::string type, JexPluginInstance* instance);
+    // Gives an instance back to the module that created it, whatever module
+    // serves its type now (a later discovery may have added another).  A
+    // module stays loaded as long as the manager lives.
+    void destroyPluginInstance(const PluginModule* creator, JexPluginInstance* instance);
 
     // Discovery: loads the plug-ins of the tree that are not loaded yet.
     // JEX_SUCCESS when at least one module was newly loaded.
@@ -74,6 +81,9 @@ private:
     // The module serving `type`, or null after logging "<who>(<type>) - ...".
     PluginModule* moduleFor(const std::string& type, const char* who) const;
 
+    // Sessions of different threads share the manager: every public
+    // operation holds this (recursive: a plug-in may call back in).
+    mutable std::recursive_mutex m_mutex;
     std::vector<const char*> m_targetTypes;
     std::unordered_map<std::string_view, std::string_view> m_typeToKey;
     std::unordered_map<std::string_view, PluginModule*> m_keyToPlugin;

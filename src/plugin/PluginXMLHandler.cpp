@@ -1,5 +1,6 @@
 #include "plugin/PluginXMLHandler.hpp"
 
+#include <xercesc/sax/SAXException.hpp>
 #include <xercesc/util/TransService.hpp>
 
 #include "util/Logger.hpp"
@@ -22,6 +23,11 @@ std::string toNarrow(const XMLCh* text) { return text ? toNarrow(text, xercesc::
 } // namespace
 
 PluginXMLHandler::~PluginXMLHandler() = default;
+
+xercesc::InputSource* PluginXMLHandler::resolveEntity(const XMLCh* const /*publicId*/, const XMLCh* const /*systemId*/)
+{
+    throw xercesc::SAXException("external entities are not read");
+}
 
 void PluginXMLHandler::startDocument()
 {

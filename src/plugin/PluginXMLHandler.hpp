@@ -9,7 +9,8 @@
 // Every character-data event inside a "targetname" element adds one name,
 // exactly as the parser reports it (no trimming, no joining).  Element names
 // are compared by local name, exactly and case-sensitively.  Errors and
-// warnings are ignored; a fatal error ends the parse with an exception.
+// warnings are ignored; a fatal error ends the parse with an exception, and
+// so does any external entity the descriptor names.
 
 #include <string>
 #include <vector>
@@ -24,6 +25,8 @@ public:
     ~PluginXMLHandler() override;
 
     void characters(const XMLCh* const chars, const XMLSize_t length) override;
+    // Refuses every external entity and DTD: throws, which ends the parse.
+    xercesc::InputSource* resolveEntity(const XMLCh* const publicId, const XMLCh* const systemId) override;
     void endDocument() override;
     void endElement(const XMLCh* const uri, const XMLCh* const localname, const XMLCh* const qname) override;
     void startDocument() override;

@@ -7,6 +7,8 @@
 #include <xercesc/sax2/SAX2XMLReader.hpp>
 #include <xercesc/sax2/XMLReaderFactory.hpp>
 #include <xercesc/util/PlatformUtils.hpp>
+#include <xercesc/util/SecurityManager.hpp>
+#include <xercesc/util/XMLUni.hpp>
 #include <xercesc/util/XMLString.hpp>
 
 #include "jexjtag/types.h"
@@ -28,6 +30,22 @@ struct TranscodedPath {
     TranscodedPath& operator=(const TranscodedPath&) = delete;
 };
 
+// Descriptors are local files of the installation: nothing they name is
+// loaded (an external DTD or entity goes to the handler, which refuses the
+// descriptor; the parser's own resolution is off), and entity expansion is
+// limited, so a descriptor cannot make the parser reach the network, read
+// other files or expand without end.
+constexpr XMLSize_t kEntityExpansionLimit = 1000;
+
+void restrict(xercesc::SAX2XMLReader& reader, xercesc::SecurityManager& security)
+{
+    using xercesc::XMLUni;
+    reader.setFeature(XMLUni::fgXercesDisableDefaultEntityResolution, true);
+    reader.setFeature(XMLUni::fgSAX2CoreValidation, false);
+    security.setEntityExpansionLimit(kEntityExpansionLimit);
+    reader.setProperty(XMLUni::fgXercesSecurityManager, &security);
+}
+
 // Parses the readable file at path; JEX_SUCCESS as getPluginXMLInfo says.
 // Everything it creates is released in reverse order (handler, input
 // source, reader, converted path) before it returns.
@@ -41,8 +59,11 @@ unsigned parseDescriptor(const std::string& path, std::vector<std::string>& name
             xercesc::XMLReaderFactory::createXMLReader(xercesc::XMLPlatformUtils::fgMemoryManager, nullptr));
         xercesc::LocalFileInputSource source(widePath.text);
         PluginXMLHandler handler;
+        xercesc::SecurityManager security;
+        restrict(*reader, security);
         reader->setContentHandler(&handler);
         reader->setErrorHandler(&handler);
+        reader->setEntityResolver(&handler);
 
         Logger::logger.printLog(5, "getPluginXMLInfo - Attempting to parse %s\n", path.c_str());
         reader->parse(source);

@@ -4,6 +4,7 @@
 // first use and kept until the library is unloaded.
 
 #include <memory>
+#include <mutex>
 #include <vector>
 
 namespace JexRT {
@@ -31,6 +32,7 @@ public:
 private:
     MessageManager();
 
+    std::recursive_mutex m_mutex;
     std::vector<MessageListener*> m_listeners;
     std::unique_ptr<PortabilityMessageInterceptor> m_interceptor;
 };

@@ -14,8 +14,9 @@ namespace JexRT {
 
 namespace {
 
-// The narrow form of the last host-layer message (1023 characters at most).
-char g_narrowText[1024];
+// The narrow form of the last host-layer message of this thread (1023
+// characters at most).
+thread_local char g_narrowText[1024];
 
 // Converts `text` into g_narrowText in the current locale.  The text is cut
 // at a character boundary when it does not fit; characters the locale

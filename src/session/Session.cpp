@@ -56,6 +56,7 @@ void Session::release()
 
 void Session::sendMessage(unsigned msgType, const std::string& text)
 {
+    if (m_closing) return;
     if (m_msgCallback) {
         m_msgCallback(m_handle, msgType, text.c_str());
         return;

@@ -4,6 +4,7 @@
 // the session-level operations every other layer uses.  Only the registry
 // constructs and destroys sessions.
 
+#include <atomic>
 #include <istream>
 #include <memory>
 #include <string>
@@ -36,22 +37,31 @@ public:
     // length, the IDCODE register text ("" when the device has none) and
     // the first BYPASS opcode, each text cut to 2047 characters.  On
     // failure the host gets an error message and outputs written before the
-    // failure keep their values.  JEX_SUCCESS or JEX_FAILURE.
+    // failure keep their values.  Messages name the file `shownName` (the
+    // path when empty).  JEX_SUCCESS or JEX_FAILURE.
     virtual unsigned parseBSDLFromFile(const std::string& path, std::string& deviceName, unsigned* irlength,
-                                       std::string& idcode, std::string& bypass);
+                                       std::string& idcode, std::string& bypass, const std::string& shownName = "");
+    // Reads the BSDL file at `path` whole, once and without seeking (pipes
+    // and FIFOs work), at most the BSDL reader's size limit.  On failure the
+    // host gets an error message naming the file.  JEX_SUCCESS or
+    // JEX_FAILURE.
+    virtual unsigned readBSDLFile(const std::string& path, std::string& content);
     virtual const char* getClassName() const { return "Session"; }
     virtual unsigned getHandle() const { return m_handle; }
 
     // The target slot (only index 0 exists).  getTarget: the target or
     // null.  createTarget: destroys the old target first, then stores and
     // returns a new one (null for another index or when it cannot be
-    // made).  destroyTarget: deletes the target, which closes it.
+    // made).  destroyTarget: takes the target out of the slot and deletes
+    // it, which closes it; inside a call from a callback the deletion waits
+    // until the outermost call returns (the target may be in use).
     virtual Target* getTarget(unsigned index) const;
     virtual Target* createTarget(unsigned index);
     virtual void destroyTarget(unsigned index);
 
     // Delivers a message to the host: its callback, or else standard output
     // with the type's prefix ("Error:", "Warning:", "Status:", "Info:").
+    // Nothing once the host has destroyed the session.
     virtual void sendMessage(unsigned msgType, const std::string& text);
 
     // Stores the host's search path, then refreshes the target list.
@@ -78,12 +88,20 @@ public:
                                   bool* isUserList);
     // The same for a BSDL text in memory: it is written to a temporary file
     // named after the base name of `filename` in the per-user ".lumenfold"
-    // directory, read from there, and the file is removed again.
+    // directory, read from there, and the file is removed again.  Messages
+    // name `filename`.  A text larger than the reader's limit fails before
+    // anything is copied.
     virtual unsigned parseBSDLFromBuffer(const std::string& filename, const char* buf, unsigned bufLen,
                                          std::string& deviceName, unsigned* irlength, std::string& idcode,
                                          std::string& bypass);
 
     const std::vector<std::string>& getArguments() const { return m_args; }
+
+    // Set by the registry when the host destroys the session: its handle
+    // reaches nothing any more and its messages are dropped, while a call
+    // still under way finishes with it.
+    void markClosing() { m_closing = true; }
+    bool isClosing() const { return m_closing; }
 
     // The one plug-in manager of the process: created by the first
     // session's init, deleted by the registry after the last session
@@ -98,6 +116,7 @@ private:
     std::string m_pluginSearchPath;
     std::unique_ptr<InternalSessionMessageListener> m_messageListener;
     DeviceDB m_deviceDB;
+    std::atomic<bool> m_closing {false};
 };
 
 } // namespace JexRT

@@ -66,10 +66,11 @@ private:
 } // namespace
 
 unsigned Session::parseBSDLFromFile(const std::string& path, std::string& deviceName, unsigned* irlength,
-                                    std::string& idcode, std::string& bypass)
+                                    std::string& idcode, std::string& bypass, const std::string& shownName)
 {
     try {
-        std::unique_ptr<BsdlReader, ReaderRelease> reader(BsdlReader::CreateBsdlReader(path.c_str()));
+        std::unique_ptr<BsdlReader, ReaderRelease> reader(
+            BsdlReader::CreateBsdlReader(path.c_str(), shownName.empty() ? path.c_str() : shownName.c_str()));
         if (!reader) {
             sendMessage(JEX_MSG_ERROR, "Could not obtain a BsdlReader\n");
             return JEX_FAILURE;
@@ -86,10 +87,25 @@ unsigned Session::parseBSDLFromFile(const std::string& path, std::string& device
     }
 }
 
+unsigned Session::readBSDLFile(const std::string& path, std::string& content)
+{
+    try {
+        return BsdlReader::ReadFile(path.c_str(), path.c_str(), content) ? JEX_SUCCESS : JEX_FAILURE;
+    } catch (const Port::Exception& e) {
+        sendMessage(JEX_MSG_ERROR, getLocalizedPortMsg(e.getMessage()));
+        return JEX_FAILURE;
+    }
+}
+
 unsigned Session::parseBSDLFromBuffer(const std::string& filename, const char* buf, unsigned bufLen,
                                       std::string& deviceName, unsigned* irlength, std::string& idcode,
                                       std::string& bypass)
 {
+    if (bufLen > BsdlReader::kMaxFileSize) {
+        sendMessage(JEX_MSG_ERROR, "BSDL file '" + filename + "': the text is larger than " +
+                                       std::to_string(BsdlReader::kMaxFileSize >> 20) + " MiB; it is not read\n");
+        return JEX_FAILURE;
+    }
     try {
         TemporaryFile file(Jex_Util::createDotLumenfoldTempFile(baseName(filename)));
         std::FILE* out = std::fopen(file.path().c_str(), "wb");
@@ -105,7 +121,7 @@ unsigned Session::parseBSDLFromBuffer(const std::string& filename, const char* b
             return JEX_FAILURE;
         }
 
-        const unsigned status = parseBSDLFromFile(file.path(), deviceName, irlength, idcode, bypass);
+        const unsigned status = parseBSDLFromFile(file.path(), deviceName, irlength, idcode, bypass, filename);
 
         if (!file.remove())
             sendMessage(JEX_MSG_ERROR, "Could not remove temporary file: " + file.path() +

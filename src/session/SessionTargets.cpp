@@ -2,6 +2,7 @@
 
 #include <new>
 
+#include "session/ApiCallScope.hpp"
 #include "session/Session.hpp"
 #include "target/Target.hpp"
 
@@ -26,7 +27,8 @@ void Session::destroyTarget(unsigned index)
     if (index != 0 || !m_target) return;
     Target* target = m_target;
     m_target = nullptr;
-    delete target;
+    if (ApiCallScope::nested()) ApiCallScope::defer([target] { delete target; });
+    else delete target;
 }
 
 } // namespace JexRT

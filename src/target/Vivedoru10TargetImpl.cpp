@@ -19,6 +19,9 @@ namespace {
 
 constexpr unsigned kReadBit = JEXJTAG_SHIFT_READ;
 constexpr unsigned kWriteBit = JEXJTAG_SHIFT_WRITE;
+// Every device has an instruction register of at least 2 bits, and no
+// chain is read with an IR scan longer than 4096 bits.
+constexpr unsigned kMaxChainDevices = 2048;
 
 // The plug-in's operation, or null (logged) when its table lacks it: a
 // missing operation fails like a refusing plug-in instead of crashing.
@@ -30,14 +33,17 @@ Op pluginOp(const JexPluginInstance* instance, Op JexPluginOps::*member, const c
     return op;
 }
 
-JexPluginInstance* createInstance(const std::string& type)
+// An instance goes back to the module that created it: a later discovery
+// may have made another module serve the same type.
+JexPluginInstance* createInstance(const std::string& type, const PluginModule*& creator)
 {
-    return Session::m_pluginManager ? Session::m_pluginManager->createPluginInstance(type) : nullptr;
+    creator = nullptr;
+    return Session::m_pluginManager ? Session::m_pluginManager->createPluginInstance(type, &creator) : nullptr;
 }
 
-void destroyInstance(const std::string& type, JexPluginInstance* instance)
+void destroyInstance(const PluginModule* creator, JexPluginInstance* instance)
 {
-    if (Session::m_pluginManager) Session::m_pluginManager->destroyPluginInstance(type, instance);
+    if (Session::m_pluginManager) Session::m_pluginManager->destroyPluginInstance(creator, instance);
 }
 
 struct ShiftNames {
@@ -112,7 +118,8 @@ unsigned Vivedoru10TargetImpl::open(const std::string& name, JexJtagCallContext*
         return tracer.setReturnStatus(result);
     }
 
-    JexPluginInstance* instance = createInstance(name);
+    const PluginModule* creator = nullptr;
+    JexPluginInstance* instance = createInstance(name, creator);
     if (!instance) {
         reportError("Could not open plugin of the type: " + name +
                     ". Please check to make sure the correct plug-in for this type is installed.\n");
@@ -127,8 +134,12 @@ unsigned Vivedoru10TargetImpl::open(const std::string& name, JexJtagCallContext*
             result = openTarget(instance, argc, argv.data(), &copy);
         if (Logger::logger.isEnabled(3))
             Logger::logger.printLog(3, "openTarget %s, returned %s\n", name.c_str(), statusText(result));
-        if (JEX_FAILED(result)) destroyInstance(name, instance);
-        else m_plugin = instance;
+        if (JEX_FAILED(result)) {
+            destroyInstance(creator, instance);
+        } else {
+            m_plugin = instance;
+            m_creator = creator;
+        }
     }
 
     if (Logger::logger.isEnabled(3))
@@ -150,7 +161,8 @@ unsigned Vivedoru10TargetImpl::close()
 
     JexPluginInstance* instance = m_plugin;
     m_plugin = nullptr;
-    destroyInstance(m_targetName, instance);
+    destroyInstance(m_creator, instance);
+    m_creator = nullptr;
     return tracer.setReturnStatus(result);
 }
 
@@ -200,7 +212,8 @@ unsigned Vivedoru10TargetImpl::cleanLocks(const std::string& type)
         return tracer.setReturnStatus(result);
     }
 
-    JexPluginInstance* instance = createInstance(type);
+    const PluginModule* creator = nullptr;
+    JexPluginInstance* instance = createInstance(type, creator);
     if (Logger::logger.isEnabled(3))
         Logger::logger.printLog(3, "Session::m_pluginManager->createPluginInstance(type=%s), returned %s\n",
                                 type.c_str(), PointerText(instance).c_str());
@@ -209,7 +222,7 @@ unsigned Vivedoru10TargetImpl::cleanLocks(const std::string& type)
             setHandle(instance, m_session ? m_session->getHandle() : 0);
         if (auto clean = pluginOp(instance, &JexPluginOps::cleanLocks, "cleanLocks")) result = clean(instance);
         Logger::logger.printLog(3, "cleanLocks() returning %s\n", statusText(result));
-        destroyInstance(type, instance);
+        destroyInstance(creator, instance);
     }
     return tracer.setReturnStatus(result);
 }
@@ -341,8 +354,16 @@ unsigned Vivedoru10TargetImpl::getDeviceCount(unsigned* count)
     if (!hasPlugin()) return tracer.setReturnStatus(JEX_FAILURE);
     auto op = pluginOp(m_plugin, &JexPluginOps::getDeviceCount, "getDeviceCount");
     if (!op) return tracer.setReturnStatus(JEX_FAILURE);
-    *count = op(m_plugin);
-    Logger::logger.printLog(3, "getDeviceCount() returning %d\n", static_cast<int>(*count));
+    const unsigned answer = op(m_plugin);
+    Logger::logger.printLog(3, "getDeviceCount() returning %d\n", static_cast<int>(answer));
+    // The operation has no failure channel: an error value shows up as a
+    // count that no chain can have.
+    if (answer > kMaxChainDevices) {
+        reportError("The plug-in reports " + std::to_string(answer) + " devices on the chain; a chain has at most " +
+                    std::to_string(kMaxChainDevices) + ".\n");
+        return tracer.setReturnStatus(JEX_FAILURE);
+    }
+    *count = answer;
     return tracer.setReturnStatus(JEX_SUCCESS);
 }
 
@@ -446,7 +467,8 @@ unsigned Vivedoru10TargetImpl::navigate(unsigned newState, unsigned clockRepeat,
 
     if (microSeconds != 0) {
         if (auto flushOp = pluginOp(m_plugin, &JexPluginOps::flush, "flush")) flushOp(m_plugin);
-        jexplatform::sleepMilliseconds(microSeconds / 1000);
+        // Callers wait for device timing: never less than asked.
+        jexplatform::sleepMicroseconds(microSeconds);
         Logger::logger.printLog(3, "Slept for %u microSeconds...\n", microSeconds);
     }
     return tracer.setReturnStatus(result);

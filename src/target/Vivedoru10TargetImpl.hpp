@@ -19,6 +19,7 @@
 namespace JexRT {
 
 class Session;
+struct PluginModule;
 
 class Vivedoru10TargetImpl : public ITarget {
 public:
@@ -54,6 +55,8 @@ public:
     unsigned autodetect(unsigned algorithm) override;
     // The algorithm is not passed on.
     unsigned interrogate(unsigned algorithm) override;
+    // A count above 2048 (no chain has more devices; plug-ins answer
+    // 0xFFFFFFFF and the like for an error) fails with an error message.
     unsigned getDeviceCount(unsigned* count) override;
     unsigned setDeviceCount(unsigned count) override;
     // Appends one '1' per instruction-register bit (BYPASS is all ones).
@@ -64,8 +67,8 @@ public:
     unsigned setIRLength(unsigned deviceIndex, unsigned irlen) override;
     unsigned getDeviceIdcode(unsigned deviceIndex, IDCode& idcode) override;
     unsigned setDeviceIdcode(unsigned deviceIndex, const IDCode& idcode) override;
-    // navigateTAP; with microSeconds > 0 then flush and sleep
-    // microSeconds / 1000 ms whatever navigateTAP answered.
+    // navigateTAP; with microSeconds > 0 then flush and sleep at least
+    // microSeconds whatever navigateTAP answered.
     unsigned navigate(unsigned newState, unsigned clockRepeat, unsigned microSeconds) override;
     unsigned shiftChainIR(const unsigned char* tdibuf, unsigned char* tdobuf, unsigned bitCount,
                           const unsigned char* tdimask, const unsigned char* tdomask, unsigned shiftMode,
@@ -101,6 +104,7 @@ private:
 
     Session* m_session;
     JexPluginInstance* m_plugin = nullptr;
+    const PluginModule* m_creator = nullptr; // the module m_plugin came from
     std::string m_targetName;        // the type m_plugin was created under
     std::vector<std::string> m_args; // of the last accepted open
     bool m_locked = false;

@@ -13,10 +13,9 @@ namespace {
 
 using jexbsdl::BsdlDiagnostics;
 
-// Reads the whole file; false (with an error message raised) when it cannot.
-// The buffer is sized once from the file's length where the file has one,
-// then whatever else the file holds (a pipe, a file still growing) is read
-// on in chunks, up to the size limit.
+// Reads the whole file once, from its start, without seeking, so pipes and
+// FIFOs work too; false (with an error message raised) when it cannot.
+// More than the size limit is never read: the read stops there and fails.
 bool readFile(const char* path, std::string& content, BsdlDiagnostics& diagnostics)
 {
     std::FILE* file = std::fopen(path, "rb");
@@ -25,27 +24,12 @@ bool readFile(const char* path, std::string& content, BsdlDiagnostics& diagnosti
         return false;
     }
     std::unique_ptr<std::FILE, int (*)(std::FILE*)> closer(file, &std::fclose);
-    const auto tooLarge = [&] {
-        diagnostics.error(0, "the file is larger than " + std::to_string(BsdlReader::kMaxFileSize >> 20) +
-                                 " MiB; it is not read");
-    };
-    if (std::fseek(file, 0, SEEK_END) == 0) {
-        // A length beyond the limit is not trusted (directories report
-        // huge ones): the chunked read below finds out what is there.
-        const long length = std::ftell(file);
-        if (std::fseek(file, 0, SEEK_SET) != 0) {
-            diagnostics.report(0, std::string("cannot be read: ") + std::strerror(errno));
-            return false;
-        }
-        if (length > 0 && static_cast<unsigned long>(length) <= BsdlReader::kMaxFileSize) {
-            content.resize(static_cast<size_t>(length));
-            content.resize(std::fread(&content[0], 1, content.size(), file));
-        }
-    }
     char chunk[65536];
     while (!std::ferror(file) && !std::feof(file)) {
         const size_t n = std::fread(chunk, 1, sizeof chunk, file);
-        if (content.size() + n > BsdlReader::kMaxFileSize) tooLarge();
+        if (content.size() + n > BsdlReader::kMaxFileSize)
+            diagnostics.error(0, "the file is larger than " + std::to_string(BsdlReader::kMaxFileSize >> 20) +
+                                     " MiB; it is not read");
         content.append(chunk, n);
     }
     if (std::ferror(file)) {
@@ -57,13 +41,21 @@ bool readFile(const char* path, std::string& content, BsdlDiagnostics& diagnosti
 
 } // namespace
 
-BsdlReader* BsdlReader::CreateBsdlReader(const char* path)
+BsdlReader* BsdlReader::CreateBsdlReader(const char* path, const char* name)
 {
     if (!path) return nullptr;
-    BsdlDiagnostics diagnostics(path);
+    if (!name) name = path;
     std::string content;
-    if (!readFile(path, content, diagnostics)) return nullptr;
-    return CreateBsdlReaderFromBuffer(path, content.data(), content.size());
+    if (!ReadFile(path, name, content)) return nullptr;
+    return CreateBsdlReaderFromBuffer(name, content.data(), content.size());
+}
+
+bool BsdlReader::ReadFile(const char* path, const char* name, std::string& content)
+{
+    content.clear();
+    if (!path) return false;
+    BsdlDiagnostics diagnostics(name ? name : path);
+    return readFile(path, content, diagnostics);
 }
 
 BsdlReader* BsdlReader::CreateBsdlReaderFromBuffer(const char* name, const char* data, size_t size)

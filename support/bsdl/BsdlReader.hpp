@@ -9,6 +9,7 @@
 // oddities that do not stop the reading are raised as host-layer warnings.
 
 #include <cstddef>
+#include <string>
 
 #include "bsdl/BsdlEntity.hpp"
 
@@ -17,11 +18,18 @@ public:
     // Files larger than this are refused.
     static constexpr size_t kMaxFileSize = 64u << 20;
 
-    // Reads the file at `path`.  Null when the file cannot be read or holds
-    // no entity declaration (it is not BSDL); the reason is raised as a
-    // host-layer error message.  Throws Port::Exception when the file is
-    // BSDL but malformed.
-    static BsdlReader* CreateBsdlReader(const char* path);
+    // Reads the file at `path`; messages name the file `name` (default: the
+    // path), for a copy read in place of the file the user gave.  Null when
+    // the file cannot be read or holds no entity declaration (it is not
+    // BSDL); the reason is raised as a host-layer error message.  Throws
+    // Port::Exception when the file is BSDL but malformed or too large.
+    static BsdlReader* CreateBsdlReader(const char* path, const char* name = nullptr);
+    // Reads the file at `path` whole into content, once and without seeking
+    // (pipes and FIFOs work), never more than kMaxFileSize bytes.  False
+    // when it cannot be opened or read (the reason raised as a host-layer
+    // error message, naming `name`); throws Port::Exception when it is
+    // larger than kMaxFileSize.
+    static bool ReadFile(const char* path, const char* name, std::string& content);
     // The same for a text in memory; `name` labels the messages.
     static BsdlReader* CreateBsdlReaderFromBuffer(const char* name, const char* data, size_t size);
 

@@ -10,8 +10,10 @@ namespace {
 
 Port_MsgManDefault& builtInPrinter()
 {
-    static Port_MsgManDefault printer("jexjtag");
-    return printer;
+    // Never destroyed, like the state below: messages may come from atexit
+    // handlers and global destructors.
+    static Port_MsgManDefault* const printer = new Port_MsgManDefault("jexjtag");
+    return *printer;
 }
 
 struct DispatcherState {
@@ -24,8 +26,8 @@ struct DispatcherState {
 // initialisation.
 DispatcherState& state()
 {
-    static DispatcherState s;
-    return s;
+    static DispatcherState* const s = new DispatcherState();
+    return *s;
 }
 
 } // namespace

@@ -61,7 +61,23 @@ bool ensurePrivateDirectory(const std::string& dir, std::string& reason)
         reason = "owned by another user";
         return false;
     }
+    if ((st.st_mode & 077) != 0 && chmod(dir.c_str(), 0700) != 0) {
+        reason = std::string("open to other users and cannot be made private: ") + std::strerror(errno);
+        return false;
+    }
     return true;
+}
+
+std::string perUserTemporaryDirectory(const std::string& stem)
+{
+    std::string base;
+    for (const char* name : {"XDG_RUNTIME_DIR", "TMPDIR"})
+        if (const char* value = std::getenv(name); value && *value) {
+            base = value;
+            break;
+        }
+    if (base.empty()) base = "/tmp";
+    return base + kPathSeparator + stem + "-" + std::to_string(geteuid());
 }
 
 std::string createUniqueFile(const std::string& dir, const std::string& base, std::string& reason)

@@ -20,9 +20,14 @@ bool isDirectory(const std::string& path);
 std::vector<std::string> listDirectory(const std::string& dir);
 // The user's home directory ("" when unknown).
 std::string homeDirectory();
-// Makes sure dir exists as a real directory owned by this user; creates it
-// with mode 0700 when missing.  False (with a reason) otherwise.
+// Makes sure dir exists as a real directory owned by this user with mode
+// 0700: creates it so when missing, takes group and other access away when
+// it has any.  False (with a reason) otherwise.
 bool ensurePrivateDirectory(const std::string& dir, std::string& reason);
+// A per-user directory name for private files when the home directory
+// cannot be used: <$XDG_RUNTIME_DIR, else $TMPDIR, else /tmp>/<stem>-<uid>.
+// Nothing is created.
+std::string perUserTemporaryDirectory(const std::string& stem);
 // Creates a new, empty file dir/<base>.XXXXXX with a unique suffix, mode
 // 0600, exclusively (never follows or reuses an existing name).  Returns
 // its path, or "" (with a reason) on failure.

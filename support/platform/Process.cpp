@@ -13,6 +13,11 @@ void sleepMilliseconds(unsigned ms)
     if (ms) std::this_thread::sleep_for(std::chrono::milliseconds(ms));
 }
 
+void sleepMicroseconds(unsigned us)
+{
+    if (us) std::this_thread::sleep_for(std::chrono::microseconds(us));
+}
+
 std::string moduleDirectoryOf(const void* address)
 {
     Dl_info info {};

@@ -5,16 +5,24 @@
 #include <cstdlib>
 #include <cstring>
 #include <cwchar>
+#include <mutex>
 
 #include "platform/FileSystem.hpp"
 #include "platform/Process.hpp"
 
 namespace {
 
-std::string& userDataDir()
+// The data directory a session set, shared by every thread; never
+// destroyed, like the library's other process-wide state.
+struct UserDataDir {
+    std::mutex mutex;
+    std::string dir;
+};
+
+UserDataDir& userDataDir()
 {
-    static std::string dir;
-    return dir;
+    static UserDataDir* const dir = new UserDataDir();
+    return *dir;
 }
 
 std::string withTrailingSeparator(std::string dir)
@@ -96,7 +104,10 @@ int Jex_Util::isDirectory(const std::string& path) { return jexplatform::isDirec
 
 std::string Jex_Util::getDataDirPath()
 {
-    if (!userDataDir().empty()) return withTrailingSeparator(userDataDir());
+    {
+        std::lock_guard<std::mutex> lock(userDataDir().mutex);
+        if (!userDataDir().dir.empty()) return withTrailingSeparator(userDataDir().dir);
+    }
     const std::string env = jexplatform::environment("JEXJTAG_DATA_DIR");
     if (!env.empty()) return withTrailingSeparator(env);
     // <prefix>/lib/libJexJtag.so finds <prefix>/share/jexjtag; a Debian
@@ -117,13 +128,35 @@ std::string Jex_Util::getPluginRootPath()
     return libDir + "/plugins";
 }
 
-void Jex_Util::setUserDataDirPath(const std::string& dir) { userDataDir() = dir; }
+void Jex_Util::setUserDataDirPath(const std::string& dir)
+{
+    std::lock_guard<std::mutex> lock(userDataDir().mutex);
+    userDataDir().dir = dir;
+}
 
 std::string Jex_Util::dotLumenfoldDirectory()
 {
     const std::string home = jexplatform::homeDirectory();
     if (home.empty()) throw Jex_Exception("Could not find the home directory for the .lumenfold directory.");
     return home + jexplatform::kPathSeparator + ".lumenfold";
+}
+
+std::string Jex_Util::privateTemporaryDirectory()
+{
+    // The home directory's .lumenfold, made private; when the home directory
+    // is unusable (system users have none), a per-user one elsewhere.
+    std::string homeReason = "no home directory";
+    std::string dir;
+    try {
+        dir = dotLumenfoldDirectory();
+        if (jexplatform::ensurePrivateDirectory(dir, homeReason)) return dir;
+    } catch (const Jex_Exception&) {
+    }
+    const std::string fallback = jexplatform::perUserTemporaryDirectory("jexjtag-lumenfold");
+    std::string reason;
+    if (jexplatform::ensurePrivateDirectory(fallback, reason)) return fallback;
+    throw Jex_Exception("Could not use the directory " + (dir.empty() ? std::string("~/.lumenfold") : dir) + ": " +
+                        homeReason + ", nor " + fallback + ": " + reason + "\n");
 }
 
 std::string Jex_Util::createDotLumenfoldTempFile(const std::string& name)
@@ -135,10 +168,8 @@ std::string Jex_Util::createDotLumenfoldTempFile(const std::string& name)
     if (base.find_first_not_of('.') == std::string::npos) base = "tmp" + base;
     if (base.size() > 200) base.resize(200);
 
-    const std::string dir = dotLumenfoldDirectory();
+    const std::string dir = privateTemporaryDirectory();
     std::string reason;
-    if (!jexplatform::ensurePrivateDirectory(dir, reason))
-        throw Jex_Exception("Could not use the directory " + dir + ": " + reason + "\n");
     const std::string path = jexplatform::createUniqueFile(dir, base, reason);
     if (path.empty())
         throw Jex_Exception("Could not create temporary file: " + dir + jexplatform::kPathSeparator + base + ": " +

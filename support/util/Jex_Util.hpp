@@ -42,14 +42,19 @@ public:
     // Process-wide override of the data directory ("" restores the default).
     static void setUserDataDirPath(const std::string& dir);
 
-    // Creates a new private temporary file for `name` in $HOME/.lumenfold
-    // (made 0700 when missing) and returns its full path.  Separators and
+    // Creates a new private temporary file for `name` in the directory of
+    // privateTemporaryDirectory() and returns its full path.  Separators and
     // ".." in name are neutralised, so the file never lands outside that
     // directory; the file is created exclusively with mode 0600 under a
     // unique suffix.  Throws Jex_Exception when it cannot.
     static std::string createDotLumenfoldTempFile(const std::string& name);
     // The per-user ".lumenfold" directory.
     static std::string dotLumenfoldDirectory();
+    // Makes sure a private (0700, this user's) directory for temporary files
+    // exists and returns it: $HOME/.lumenfold, or when that cannot be used,
+    // the per-user directory jexjtag-lumenfold-<uid> under $XDG_RUNTIME_DIR,
+    // $TMPDIR or /tmp.  Throws Jex_Exception when neither can be used.
+    static std::string privateTemporaryDirectory();
 };
 
 // Narrow text (current locale) of a host-layer wide message; characters the

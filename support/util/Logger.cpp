@@ -8,12 +8,6 @@
 
 Logger Logger::logger;
 
-Logger::~Logger()
-{
-    if (m_file) std::fclose(m_file);
-    m_file = nullptr;
-}
-
 void Logger::startLogging()
 {
     const std::string level = jexplatform::environment("JEXJTAG_LOG_LEVEL");
@@ -23,6 +17,7 @@ void Logger::startLogging()
 
 void Logger::configure(int level, const std::string& path)
 {
+    std::lock_guard<std::mutex> lock(m_mutex);
     m_level = level < 0 ? 0 : level;
     if (path != m_path) openSink(path);
 }
@@ -40,6 +35,7 @@ void Logger::openSink(const std::string& path)
 
 void Logger::write(int level, const char* format, va_list args)
 {
+    std::lock_guard<std::mutex> lock(m_mutex);
     std::FILE* out = m_file ? m_file : stderr;
     char small[512];
     va_list again;
@@ -67,6 +63,7 @@ void Logger::write(int level, const char* format, va_list args)
 void Logger::dumpBuffer(int level, const char* title, const unsigned char* bytes, unsigned bitLength)
 {
     if (!isEnabled(level)) return;
+    std::lock_guard<std::mutex> lock(m_mutex);
     std::FILE* out = m_file ? m_file : stderr;
     if (m_midLine) std::fputc('\n', out);
     m_midLine = false;

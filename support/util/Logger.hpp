@@ -7,11 +7,14 @@
 // writes nothing); JEXJTAG_LOG_FILE names a file to append to (default:
 // standard error).  Each line is the caller's formatted text, after a short
 // prefix "[jexjtag N] " that names its level; a line written in several
-// calls (the first ones without a line end) gets one prefix.  A level that is not enabled
+// calls (the first ones without a line end) gets one prefix.  Safe to use
+// from several threads.  A level that is not enabled
 // costs one comparison: nothing is formatted or allocated.
 
+#include <atomic>
 #include <cstdarg>
 #include <cstdio>
+#include <mutex>
 #include <string>
 
 class Logger {
@@ -24,8 +27,8 @@ public:
     // Sets level and sink directly; an empty path means standard error.
     void configure(int level, const std::string& path);
 
-    bool isEnabled(int level) const { return level <= m_level && level > 0; }
-    int level() const { return m_level; }
+    bool isEnabled(int level) const { return level <= m_level.load(std::memory_order_relaxed) && level > 0; }
+    int level() const { return m_level.load(std::memory_order_relaxed); }
 
     void printLog(int level, const char* format, ...)
 #if defined(__GNUC__)
@@ -48,7 +51,9 @@ public:
     void logMethodExit(const char* name);
 
     constexpr Logger() = default;
-    ~Logger();
+    // Leaves the sink open: lines may still come from atexit handlers and
+    // global destructors, and the process closes the file at its end.
+    ~Logger() = default;
     Logger(const Logger&) = delete;
     Logger& operator=(const Logger&) = delete;
 
@@ -56,7 +61,9 @@ private:
     void write(int level, const char* format, va_list args);
     void openSink(const std::string& path);
 
-    int m_level = 0;
+    // Lines of several threads are written whole, one at a time.
+    std::mutex m_mutex;
+    std::atomic<int> m_level {0};
     // True after a write that did not end its line: the next write goes on
     // that line, without a prefix of its own.
     bool m_midLine = false;

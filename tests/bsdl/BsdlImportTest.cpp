@@ -5,6 +5,8 @@
 #include <gtest/gtest.h>
 
 #include <cstring>
+#include <fstream>
+#include <unistd.h>
 #include <filesystem>
 #include <string>
 #include <vector>
@@ -116,12 +118,12 @@ TEST_F(BsdlImportTest, EveryVendorFileFromFileAndFromMemory)
         EXPECT_TRUE(messagesOf(JEX_MSG_ERROR).empty());
         expectNoTemporaryFiles();
     }
-    // The reader's warnings reach the host: a board-test header line is
-    // reported as skipped (in the temporary copy, named after the file).
+    // The reader's warnings reach the host, naming the caller's file: a
+    // board-test header line is reported as skipped.
     bool headerWarning = false;
     for (const std::string& w : messagesOf(JEX_MSG_WARNING))
-        headerWarning |= w.find("/.lumenfold/aspeed_AST2500.bsd.") != std::string::npos &&
-                         w.find("', line 1: text before the entity declaration") != std::string::npos;
+        headerWarning |= w.find("BSDL file '" + kData + "/aspeed_AST2500.bsd', line 1: text before the entity "
+                                "declaration") == 0;
     EXPECT_TRUE(headerWarning);
 }
 
@@ -131,11 +133,9 @@ TEST_F(BsdlImportTest, MalformedFileFailsWithTheProblemAndLeavesNoCopy)
     EXPECT_EQ(JEX_FAILURE, parseFile(handle, kData + "/fixtures/wrong-unterminated-string.bsd", o));
     const std::vector<std::string> errors = messagesOf(JEX_MSG_ERROR);
     ASSERT_EQ(1u, errors.size());
-    // The message names the temporary copy (under the file's base name),
-    // the line and the problem.
-    const std::string copy = (env.home() / ".lumenfold" / "wrong-unterminated-string.bsd").string();
-    EXPECT_EQ(0u, errors[0].find("BSDL file '" + copy)) << errors[0];
-    EXPECT_NE(std::string::npos, errors[0].find("', line 32: string literal is not closed")) << errors[0];
+    // The message names the caller's file, the line and the problem.
+    EXPECT_EQ(0u, errors[0].find("BSDL file '" + kData + "/fixtures/wrong-unterminated-string.bsd', line 32: "
+                                 "string literal is not closed")) << errors[0];
     EXPECT_TRUE(o.all('\0'));
     EXPECT_EQ(0u, o.irlength);
     expectNoTemporaryFiles();
@@ -184,14 +184,18 @@ TEST_F(BsdlImportTest, BufferRules)
     ASSERT_EQ(JEX_SUCCESS, JexJtag_db_parseBSDLFile(handle, good.c_str(), nullptr, 0, &irlength, nullptr, 0, nullptr, 0));
     EXPECT_EQ(4u, irlength);
 
-    // A file that cannot be opened leaves every output as it was.
+    // A file that cannot be opened leaves every output as it was; the host
+    // is told why.
     Outputs untouched;
     EXPECT_EQ(JEX_FAILURE, parseFile(handle, kData + "/no-such-file.bsd", untouched));
     EXPECT_TRUE(untouched.all('Z'));
     EXPECT_EQ(0xABCDu, untouched.irlength);
     EXPECT_EQ(JEX_FAILURE, JexJtag_db_parseBSDLFile(handle, nullptr, nullptr, 0, &irlength, nullptr, 0, nullptr, 0));
     EXPECT_EQ(JEX_FAILURE, parseFile(handle, kData, untouched)); // a directory
-    EXPECT_TRUE(g_received.empty());
+    ASSERT_EQ(2u, messagesOf(JEX_MSG_ERROR).size());
+    EXPECT_EQ("BSDL file '" + kData + "/no-such-file.bsd': cannot be opened: No such file or directory\n",
+              messagesOf(JEX_MSG_ERROR)[0]);
+    g_received.clear();
 
     // An unknown handle clears the outputs and fails without reading anything.
     Outputs cleared;
@@ -210,54 +214,87 @@ TEST_F(BsdlImportTest, BufferRules)
     expectNoTemporaryFiles();
 }
 
-TEST_F(BsdlImportTest, TemporaryCopyIsNamedAfterTheBaseNameAndAlwaysRemoved)
+TEST_F(BsdlImportTest, TemporaryCopyIsAlwaysRemovedAndMessagesNameTheCallersFile)
 {
     Outputs o;
     const std::string bad = "entity DEV is attribute INSTRUCTION_LENGTH of DEV : entity is x;";
     const std::string dir = (env.home() / ".lumenfold").string();
-    for (const auto& [given, base] : {std::pair<std::string, std::string> {"/some/dir/dev.bsd", "dev.bsd"},
-                                      {"C:\\boards\\win.bsd", "win.bsd"},
-                                      {"plain.bsd", "plain.bsd"},
-                                      {"  ../../escape.bsd  ", "escape.bsd"}}) {
+    for (const auto& [given, shown] : {std::pair<std::string, std::string> {"/some/dir/dev.bsd", "/some/dir/dev.bsd"},
+                                       {"C:\\boards\\win.bsd", "C:\\boards\\win.bsd"},
+                                       {"  ../../escape.bsd  ", "../../escape.bsd"}}) {
         SCOPED_TRACE(given);
         g_received.clear();
         EXPECT_EQ(JEX_FAILURE, parseText(handle, given, bad, o));
         ASSERT_EQ(1u, messagesOf(JEX_MSG_ERROR).size());
-        EXPECT_EQ(0u, messagesOf(JEX_MSG_ERROR)[0].find("BSDL file '" + dir + "/" + base + "."))
+        EXPECT_EQ(0u, messagesOf(JEX_MSG_ERROR)[0].find("BSDL file '" + shown + "', line 1:"))
             << messagesOf(JEX_MSG_ERROR)[0];
         expectNoTemporaryFiles();
     }
+    EXPECT_FALSE(fs::exists(env.root() / "escape.bsd"));
 
-    // When no temporary file can be made, the host is told and nothing is read.
-    fs::remove_all(dir);
-    testsupport::writeFile(dir, "in the way");
-    g_received.clear();
-    EXPECT_EQ(JEX_FAILURE, parseText(handle, "dev.bsd", testsupport::readFile(kData + "/st_CortexMx.bsd"), o));
-    ASSERT_EQ(1u, messagesOf(JEX_MSG_ERROR).size());
-    EXPECT_NE(std::string::npos, messagesOf(JEX_MSG_ERROR)[0].find(dir)) << messagesOf(JEX_MSG_ERROR)[0];
-    EXPECT_EQ(std::string(sizeof o.name, '\0'), std::string(o.name, sizeof o.name));
-    EXPECT_EQ("in the way", testsupport::readFile(dir));
 }
 
-TEST_F(BsdlImportTest, TraceLines)
+// ~/.lumenfold is made private; when it cannot be used a per-user directory
+// under $XDG_RUNTIME_DIR or $TMPDIR is; when neither can, the host is told.
+TEST_F(BsdlImportTest, TemporaryDirectoryIsPrivateWithAFallback)
 {
-    LogCapture log(3);
-    const std::string path = kData + "/st_CortexMx.bsd";
+    const std::string text = testsupport::readFile(kData + "/st_CortexMx.bsd");
+    const fs::path dir = env.home() / ".lumenfold";
     Outputs o;
-    ASSERT_EQ(JEX_SUCCESS, parseFile(handle, path, o));
-    std::vector<std::string> bsdlLines;
-    for (const std::string& line : log.lines())
-        if (line.rfind("JexJtag_db_", 0) == 0) bsdlLines.push_back(line);
-    const std::string h = std::to_string(handle);
-    const std::vector<std::string> expected = {
-        "JexJtag_db_parseBSDLFile() handle=" + h + ", filename=" + path + ", deviceNameLen=64, idcodeLen=40, "
-        "bypassbufLen=16\n",
-        "JexJtag_db_parseBSDL() handle=" + h + ", filename=" + path + ", bufLen=4235, deviceNameLen=64, idcodeLen=40, "
-        "bypassbufLen=16\n",
-        "JexJtag_db_parseBSDL() returning deviceName=CortexMx, irlength=4, idcode=XXXX1011101000000000010001110111, "
-        "cmd_bypass=1111\n",
-        "JexJtag_db_parseBSDLFile() returning deviceName=CortexMx, irlength=4, "
-        "idcode=XXXX1011101000000000010001110111, cmd_bypass=1111\n",
-    };
-    EXPECT_EQ(expected, bsdlLines);
+    fs::create_directories(dir);
+    fs::permissions(dir, fs::perms::all);
+    ASSERT_EQ(JEX_SUCCESS, parseText(handle, "dev.bsd", text, o));
+    EXPECT_EQ(fs::perms::owner_all, fs::status(dir).permissions() & fs::perms::all);
+
+    testsupport::ScopedEnv runtime("XDG_RUNTIME_DIR", "");
+    testsupport::ScopedEnv tmp("TMPDIR", env.root().path().string());
+    const fs::path fallback = env.root() / ("jexjtag-lumenfold-" + std::to_string(geteuid()));
+    {
+        testsupport::ScopedEnv noHome("HOME", "/nonexistent"); // as system users have
+        ASSERT_EQ(JEX_SUCCESS, parseText(handle, "dev.bsd", text, o));
+        EXPECT_STREQ("CortexMx", o.name);
+        EXPECT_EQ(fs::perms::owner_all, fs::status(fallback).permissions() & fs::perms::all);
+        EXPECT_TRUE(fs::is_empty(fallback));
+    }
+    fs::remove_all(dir);
+    testsupport::writeFile(dir, "in the way");
+    fs::remove_all(fallback);
+    testsupport::writeFile(fallback, "in the way too");
+    g_received.clear();
+    EXPECT_EQ(JEX_FAILURE, parseText(handle, "dev.bsd", text, o));
+    ASSERT_EQ(1u, messagesOf(JEX_MSG_ERROR).size());
+    EXPECT_EQ("Could not use the directory " + dir.string() + ": not a directory, nor " + fallback.string() +
+                  ": not a directory\n",
+              messagesOf(JEX_MSG_ERROR)[0]);
+    EXPECT_EQ(std::string(sizeof o.name, '\0'), std::string(o.name, sizeof o.name));
+}
+
+// Read once without seeking (a pipe works), and never past 64 MiB: a larger
+// file or text fails before anything is read whole or copied.
+TEST_F(BsdlImportTest, PipesWorkAndTheSizeLimitComesFirst)
+{
+    int fds[2];
+    ASSERT_EQ(0, pipe(fds));
+    const std::string text = testsupport::readFile(kData + "/st_CortexMx.bsd");
+    ASSERT_EQ(static_cast<ssize_t>(text.size()), write(fds[1], text.data(), text.size()));
+    close(fds[1]);
+    Outputs o;
+    EXPECT_EQ(JEX_SUCCESS, parseFile(handle, "/dev/fd/" + std::to_string(fds[0]), o));
+    close(fds[0]);
+    EXPECT_STREQ("CortexMx", o.name);
+
+    const fs::path huge = env.root() / "huge.bsd";
+    { std::ofstream(huge).put(' '); }
+    fs::resize_file(huge, 3ull << 30); // sparse
+    g_received.clear();
+    EXPECT_EQ(JEX_FAILURE, parseFile(handle, huge.string(), o));
+    ASSERT_EQ(1u, messagesOf(JEX_MSG_ERROR).size());
+    EXPECT_EQ("BSDL file '" + huge.string() + "': the file is larger than 64 MiB; it is not read\n",
+              messagesOf(JEX_MSG_ERROR)[0]);
+    g_received.clear();
+    const std::string big((64u << 20) + 1, ' ');
+    EXPECT_EQ(JEX_FAILURE, parseText(handle, "big.bsd", big, o));
+    ASSERT_EQ(1u, messagesOf(JEX_MSG_ERROR).size());
+    EXPECT_EQ("BSDL file 'big.bsd': the text is larger than 64 MiB; it is not read\n", messagesOf(JEX_MSG_ERROR)[0]);
+    expectNoTemporaryFiles();
 }

@@ -2,9 +2,12 @@
 
 #include <gtest/gtest.h>
 
+#include <fcntl.h>
+#include <sys/stat.h>
 #include <unistd.h>
 
 #include <string>
+#include <thread>
 #include <utility>
 #include <vector>
 
@@ -323,4 +326,51 @@ TEST_F(CliProgramTest, LogLevelAndVerboseReachTheLibrary)
     EXPECT_TRUE(contains(log, "JexJtag_session_create() argc=0")) << log;
     EXPECT_TRUE(contains(log, "JexJtag_tap_autodetectChain() handle=65536, algorithm=JEXJTAG_SCAN_DEFAULT")) << log;
     EXPECT_TRUE(contains(log, "JexJtag_target_unlock() handle=65536")) << log;
+}
+
+// A device shift never reports a result computed with an unknown IR length.
+TEST_F(CliProgramTest, ShiftFailsWhenADeviceOnTheChainHasNoKnownIRLength)
+{
+    expectFailure(run({"shift", "dr", "--device", "0", "--bits", "32", "--chain", "0x0362D093:6,0x12345679:5"}),
+                  "the IR length of device 1 (IDCODE 0x12345679) is unknown");
+    const RunResult r =
+        run({"shift", "dr", "--device", "0", "--bits", "32", "--chain", "0x0362D093:6,0x12345679:5", "--no-autodetect"});
+    EXPECT_EQ(0, r.exitCode) << r.err;
+}
+
+// The BSDL file is opened once: a FIFO works once a writer comes.
+TEST_F(CliProgramTest, BsdlReadsAFifo)
+{
+    const std::string fifo = (runner.dir() / "dev.bsd").string();
+    ASSERT_EQ(0, mkfifo(fifo.c_str(), 0600));
+    std::thread writer([&] {
+        const std::string text = "entity T is\n attribute INSTRUCTION_LENGTH of T : entity is 2;\n"
+                                 " attribute INSTRUCTION_OPCODE of T : entity is \"BYPASS (11)\";\nend T;\n";
+        // Bounded: a reader that never comes (or comes twice) fails the test, never hangs it.
+        for (int pass = 0; pass < 2; ++pass) {
+            int fd = -1;
+            for (int i = 0; i < 500 && fd < 0; ++i) {
+                fd = open(fifo.c_str(), O_WRONLY | O_NONBLOCK);
+                if (fd < 0) usleep(10000);
+            }
+            if (fd < 0) return;
+            if (pass == 0 && write(fd, text.data(), text.size()) < 0) ADD_FAILURE() << "write failed";
+            close(fd);
+        }
+    });
+    const RunResult r = run({"bsdl", fifo}, false);
+    writer.join();
+    EXPECT_EQ(0, r.exitCode) << r.err;
+    EXPECT_TRUE(contains(r.out, "IR length  2")) << r.out;
+}
+
+// A lock directory that cannot be used is reported as what it is.
+TEST_F(CliProgramTest, AnUnusableLockDirectoryIsNotCalledAHolder)
+{
+    const std::string blocked = (runner.dir() / "not-a-dir").string();
+    testsupport::writeFile(blocked, "");
+    runner.setEnv("JEXJTAG_LOCK_DIR", blocked);
+    const RunResult r = run({"scan", "--lock-wait", "0"});
+    expectFailure(r, "cannot lock target 'jtag_sim': jtag_sim: cannot lock port");
+    EXPECT_EQ(std::string::npos, r.err.find("locked by another process")) << r.err;
 }

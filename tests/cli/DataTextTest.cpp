@@ -40,37 +40,12 @@ TEST(DataTextTest, LengthFollowsTheDigitsWrittenOrBits)
     for (const auto& [text, bits] : tooShortOrBad) EXPECT_THROW(bitsOf(text, bits), UsageError) << text << " " << bits;
 }
 
-TEST(DataTextTest, LongValuesKeepEveryBitInPlace)
-{
-    // 72 bits across nine bytes: 0x80 followed by 16 zero digits.
-    const BitVector bits = bitsOf("0x800000000000000001");
-    ASSERT_EQ(72u, bits.size());
-    EXPECT_TRUE(bits.get(0));
-    EXPECT_TRUE(bits.get(71));
-    for (unsigned i = 1; i < 71; ++i) EXPECT_FALSE(bits.get(i)) << i;
-    EXPECT_EQ("0x800000000000000001", bits.toHex());
-}
-
 TEST(DataTextTest, BadDataIsAUsageError)
 {
     for (const char* text : {"", "0x", "0b", "0x_", "0xG1", "12", "0b102", "0x1 2", "x1", "-1"})
         EXPECT_THROW(parseData(text, std::nullopt), UsageError) << text;
     EXPECT_THROW(parseData("0x" + std::string(kMaxDataBits / 4 + 1, 'F'), std::nullopt), UsageError);
     EXPECT_EQ(kMaxDataBits, parseData("0x" + std::string(kMaxDataBits / 4, 'F'), std::nullopt).bits.size());
-}
-
-TEST(DataTextTest, BuffersFromTheLibraryIgnoreBitsPastTheLength)
-{
-    const uint8_t bytes[] = {0xFF, 0xFF};
-    const BitVector bits = BitVector::fromBytes(bytes, 12);
-    EXPECT_EQ((std::vector<uint8_t>{0xFF, 0x0F}), bits.bytes());
-    EXPECT_EQ("0xFFF", bits.toHex());
-    EXPECT_EQ(bits, bitsOf("0xFFF"));
-    EXPECT_NE(bits, bitsOf("0x0FFF"));
-    BitVector v(3);
-    v.set(7, true); // past the end: ignored
-    EXPECT_FALSE(v.get(7));
-    EXPECT_EQ((std::vector<uint8_t>{0x00}), v.bytes());
 }
 
 TEST(IdcodeTest, HexAndBinaryNotations)

@@ -63,15 +63,13 @@ TEST(ScanOutputTest, TableListsEveryDeviceNearestTdoFirst)
     EXPECT_EQ(0u, textOf(writeScanText, one).find("jtag_sim: 1 device (device 0"));
 }
 
-TEST(ScanOutputTest, IdcodeTextThatIsNotAPlainNumberIsShownAsItIs)
+TEST(ScanOutputTest, NegativeIRLengthFromThePluginIsUnknown)
 {
-    // The JSON fields of a scan are checked end to end in CliProgramTest.
-    ScanResult odd = twoDeviceChain();
-    odd.devices[0].idcodeBits = "XXXX1011101000000000010001110111";
-    const minijson::Value doc = jsonOf(writeScanJson, odd);
-    EXPECT_TRUE(doc["devices"][0]["idcode"].isNull());
-    EXPECT_EQ("XXXX1011101000000000010001110111", doc["devices"][0]["idcode_bits"].str());
-    EXPECT_NE(std::string::npos, textOf(writeScanText, odd).find("XXXX1011101000000000010001110111"));
+    ScanResult r = twoDeviceChain();
+    r.devices[1].irLength = static_cast<unsigned>(-1);
+    EXPECT_NE(std::string::npos, textOf(writeScanText, r).find("  1  0x12345678  unknown  (unknown)\n"))
+        << textOf(writeScanText, r);
+    EXPECT_TRUE(jsonOf(writeScanJson, r)["devices"][1]["ir_length"].isNull());
 }
 
 TEST(TargetsOutputTest, TextAndJsonWithAndWithoutDescriptors)

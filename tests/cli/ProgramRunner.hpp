@@ -1,26 +1,24 @@
 #pragma once
-// Runs the built jexjtag program as a child process and collects its exit
-// status, standard output and standard error.
+// Runs the built jexjtag program as a child process, with the environment
+// the runner sets, and collects its exit status, standard output and
+// standard error.  The process is a ChildProcess of the network tests, so
+// every wait is bounded.
 
-#include <errno.h>
-#include <fcntl.h>
-#include <spawn.h>
-#include <sys/wait.h>
-#include <unistd.h>
+#include <stdlib.h>
 
+#include <filesystem>
 #include <map>
-#include <stdexcept>
+#include <memory>
 #include <string>
 #include <vector>
 
+#include "net/ChildProcess.hpp"
 #include "support/TestSupport.hpp"
-
-extern char** environ;
 
 namespace clitest {
 
 struct RunResult {
-    int exitCode = -1; // -1 when the program did not exit normally
+    int exitCode = -1; // 128 + signal when killed, -1 when it did not end in time
     std::string out;
     std::string err;
 };
@@ -44,44 +42,20 @@ public:
 
     RunResult run(const std::vector<std::string>& args) const
     {
-        const std::string outPath = (m_dir / "stdout.txt").string();
-        const std::string errPath = (m_dir / "stderr.txt").string();
-        posix_spawn_file_actions_t actions;
-        posix_spawn_file_actions_init(&actions);
-        posix_spawn_file_actions_addopen(&actions, 0, "/dev/null", O_RDONLY, 0);
-        posix_spawn_file_actions_addopen(&actions, 1, outPath.c_str(), O_WRONLY | O_CREAT | O_TRUNC, 0600);
-        posix_spawn_file_actions_addopen(&actions, 2, errPath.c_str(), O_WRONLY | O_CREAT | O_TRUNC, 0600);
-
-        const std::string program = programPath();
-        std::vector<std::string> argStore{program};
-        argStore.insert(argStore.end(), args.begin(), args.end());
-        std::vector<char*> argv;
-        for (std::string& a : argStore) argv.push_back(a.data());
-        argv.push_back(nullptr);
-
-        std::vector<std::string> envStore;
-        for (char** e = environ; *e; ++e) {
-            const std::string entry = *e;
-            const std::string name = entry.substr(0, entry.find('='));
-            if (!m_env.count(name)) envStore.push_back(entry);
+        // The child inherits this process's environment, changed for the start only.
+        std::vector<std::unique_ptr<testsupport::ScopedEnv>> env;
+        for (const auto& [name, value] : m_env) {
+            env.push_back(std::make_unique<testsupport::ScopedEnv>(name.c_str(), value));
+            if (value.empty()) unsetenv(name.c_str());
         }
-        for (const auto& [name, value] : m_env)
-            if (!value.empty()) envStore.push_back(name + "=" + value);
-        std::vector<char*> envp;
-        for (std::string& e : envStore) envp.push_back(e.data());
-        envp.push_back(nullptr);
-
-        pid_t pid = 0;
-        const int rc = posix_spawn(&pid, program.c_str(), &actions, nullptr, argv.data(), envp.data());
-        posix_spawn_file_actions_destroy(&actions);
-        if (rc != 0) throw std::runtime_error("cannot start " + program);
-        int status = 0;
-        while (waitpid(pid, &status, 0) < 0)
-            if (errno != EINTR) throw std::runtime_error("waitpid failed");
+        std::vector<std::string> argv{programPath()};
+        argv.insert(argv.end(), args.begin(), args.end());
+        nettest::ChildProcess child(argv);
+        env.clear();
         RunResult result;
-        result.exitCode = WIFEXITED(status) ? WEXITSTATUS(status) : -1;
-        result.out = testsupport::readFile(outPath);
-        result.err = testsupport::readFile(errPath);
+        result.out = child.readAll();
+        result.exitCode = child.wait();
+        result.err = child.errorText();
         return result;
     }
 

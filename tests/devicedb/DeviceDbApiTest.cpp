@@ -35,7 +35,10 @@ protected:
     void SetUp() override
     {
         writeFile(env.dataDir() / "idcode.lst", kInstalledList);
-        ASSERT_EQ(JEX_SUCCESS, JexJtag_session_create(nullptr, 0, nullptr, &handle));
+        // "datadir" is process-wide: name it, whatever an earlier test left.
+        const std::string dataDir = "datadir=" + env.dataDir().string();
+        const char* argv[] = {dataDir.c_str()};
+        ASSERT_EQ(JEX_SUCCESS, JexJtag_session_create(nullptr, 1, argv, &handle));
     }
     void TearDown() override { JexJtag_session_destroy(handle); }
     unsigned add(const std::string& text, const char* name = "host.lst")
@@ -141,6 +144,25 @@ TEST_F(DeviceDbApiTest, BadLineFailsAndKeepsTheLinesBeforeIt)
     EXPECT_EQ(JEX_FAILURE, JexJtag_db_addDeviceData(0x00770000u, "x.lst", "", 0));
 }
 
+TEST_F(DeviceDbApiTest, ListOrderLimitsAndIdcodeTexts)
+{
+    // Entries kept before a bad line are sorted in: the exact pattern wins
+    // over the installation's don't-care one.
+    EXPECT_EQ(JEX_FAILURE, add("00000001010000010100000010010011 8 0 0 EXACT\nbad\n"));
+    EXPECT_EQ("EXACT", lookup(kXc3s200).name);
+    // 'x' sorts as 'X': the host's entry wins over the installation's.
+    EXPECT_EQ(JEX_SUCCESS, add("xxxx0010000010100001000011011101 10 0 0 LOWER\n"));
+    EXPECT_EQ("LOWER", lookup(kEpm240).name);
+    // An IR length above 4096 is bad data.
+    LogCapture log(2);
+    EXPECT_EQ(JEX_FAILURE, add("00000000000000000000000000000111 2000000000 0 0 HUGE\n", "huge.lst"));
+    EXPECT_TRUE(log.has("*** EXCEPTION: Input error in file: huge.lst line:0 - bad data.\n"));
+    EXPECT_EQ(JEX_SUCCESS, add("00000000000000000000000000000111 4096 0 0 BIG\n"));
+    // Only 1 to 32 characters of 0, 1, X and x are IDCODE texts.
+    for (const char* text : {"0x0362D093", "", "000000000000000000000000000000011"})
+        EXPECT_EQ(JEX_FAILURE, lookup(text).status) << text;
+}
+
 TEST_F(DeviceDbApiTest, TextsAreCutToTheirBuffers)
 {
     EXPECT_EQ(JEX_SUCCESS, add("00000000000000000000000000000111 40 0 0 WIDE_IR_DEVICE\n"));
@@ -202,40 +224,17 @@ TEST_F(DeviceDbApiTest, UnknownCodeClearsTheOutputsAFailureFillsBypassWithFF)
     EXPECT_EQ(5u, ir);
 }
 
-TEST_F(DeviceDbApiTest, TraceLines)
-{
-    LogCapture log(3);
-    unsigned irlen = 0;
-    EXPECT_EQ(JEX_SUCCESS, JexJtag_db_getIRLengthForIdcode(handle, kEpm240, &irlen));
-    add("", "trace.lst");
-    const std::string h = std::to_string(handle);
-    std::vector<std::string> traced;
-    for (const std::string& line : log.lines())
-        if (line.rfind("JexJtag_db_", 0) == 0) traced.push_back(line);
-    const std::vector<std::string> expected = {
-        "JexJtag_db_getIRLengthForIdcode() handle=" + h + ", idcode=" + kEpm240 + "\n",
-        "JexJtag_db_lookupDevice() handle=" + h + ", idcode=" + kEpm240 + ", devicebuf_size=128, bypassbuf_size=33\n",
-        "JexJtag_db_lookupDevice() returning deviceName=EPM240, irlen=10, cmd_bypass=1111111111\n",
-        "JexJtag_db_getIRLengthForIdcode() returning irlen=10\n",
-        "JexJtag_db_addDeviceData() handle=" + h + ", filename=trace.lst, bufsize=0\n",
-    };
-    EXPECT_EQ(expected, traced);
-}
-
 TEST(DeviceDbSessionCreation, MissingListFailsAndEmptyListGivesAnEmptyDatabase)
 {
     IsolatedEnvironment env;
     std::filesystem::remove(env.dataDir() / "idcode.lst");
     LogCapture log(1);
     unsigned handle = 99;
-    EXPECT_EQ(JEX_FAILURE, JexJtag_session_create(nullptr, 0, nullptr, &handle));
-    EXPECT_EQ(0u, handle);
-    EXPECT_TRUE(log.has("\nError: Unable to open " + env.dataDir().string() + "/idcode.lst\n")) << log.text();
-
-    // The same through "datadir", given with a trailing separator.
+    // "datadir" (process-wide), given with a trailing separator.
     const std::string arg = "datadir=" + env.home().string() + "/";
     const char* argv[] = {arg.c_str()};
     EXPECT_EQ(JEX_FAILURE, JexJtag_session_create(nullptr, 1, argv, &handle));
+    EXPECT_EQ(0u, handle);
     EXPECT_TRUE(log.has("\nError: Unable to open " + env.home().string() + "/idcode.lst\n")) << log.text();
 
     writeFile(env.dataDir() / "idcode.lst", "");
@@ -256,7 +255,9 @@ TEST(DeviceDbShippedList, HoldsRealDevices)
 {
     IsolatedEnvironment env;
     unsigned handle = 0;
-    ASSERT_EQ(JEX_SUCCESS, JexJtag_session_create(nullptr, 0, nullptr, &handle));
+    const std::string dataDir = "datadir=" + env.dataDir().string();
+    const char* argv[] = {dataDir.c_str()};
+    ASSERT_EQ(JEX_SUCCESS, JexJtag_session_create(nullptr, 1, argv, &handle));
     char name[64];
     char bypass[64];
     unsigned irlen = 0;

@@ -130,38 +130,6 @@ TEST_F(DeviceDbTest, DatadirWithAndWithoutTrailingSeparatorAndEmpty)
     }
 }
 
-TEST_F(DeviceDbTest, SessionWithoutReadableListIsNotCreated)
-{
-    writeFile(env.dataDir() / "idcode.lst", P + " 6 1 2 DEVA\n0101 6 1 2 SHORT\n");
-    LogCapture log(1);
-    unsigned handle = 99;
-    EXPECT_EQ(JEX_FAILURE, JexRT::createSession(nullptr, 0, nullptr, &handle));
-    EXPECT_EQ(0u, handle);
-    const std::string path = (env.dataDir() / "idcode.lst").string();
-    EXPECT_TRUE(log.has("\nInput error in file: " + path + " line:1 - bad data.\n"));
-    EXPECT_TRUE(JexRT::noLiveSessions());
-}
-
-TEST_F(DeviceDbTest, SessionLookupMissZeroesTheNumbersAndLeavesBypass)
-{
-    const unsigned h = create();
-    JexRT::Session* session = JexRT::findSession(h);
-    ASSERT_NE(nullptr, session);
-    std::string name = "old", bypass = "untouched";
-    unsigned ir = 1, family = 1, sub = 1;
-    bool user = true;
-    EXPECT_EQ(JEX_SUCCESS, session->idcodeLookup(IDCode(1u), name, &ir, &family, &sub, bypass, &user));
-    EXPECT_EQ("", name);
-    EXPECT_EQ(0u, ir + family + sub);
-    EXPECT_FALSE(user);
-    EXPECT_EQ("untouched", bypass);
-    EXPECT_EQ(JEX_SUCCESS, session->idcodeLookup(IDCode(1u), name, nullptr, nullptr, nullptr, bypass, nullptr));
-
-    std::istringstream bad("Z\n");
-    EXPECT_EQ(JEX_FAILURE, session->addDeviceData("bad.lst", bad));
-    JexRT::destroySession(h);
-}
-
 TEST(StaticAcdRead, KeysOccurrencesAndPlaces)
 {
     TempDir dir;

@@ -10,7 +10,6 @@
 
 #include <cstdint>
 #include <string>
-#include <utility>
 #include <vector>
 
 #include "jexjtag/jexjtag.h"
@@ -18,22 +17,12 @@
 
 namespace e2e {
 
-// The session's messages: (type, text) in order.
-inline std::vector<std::pair<unsigned, std::string>>& messages()
-{
-    static std::vector<std::pair<unsigned, std::string>> list;
-    return list;
-}
-
-inline void keepMessage(unsigned, unsigned type, const char* text) { messages().emplace_back(type, text ? text : ""); }
-
-inline std::vector<std::string> messagesOfType(unsigned type)
-{
-    std::vector<std::string> out;
-    for (const auto& [t, text] : messages())
-        if (t == type) out.push_back(text);
-    return out;
-}
+using testsupport::bitsOf;
+using testsupport::messages;
+using testsupport::messagesOfType;
+using testsupport::idcodeText;
+using testsupport::keepMessage;
+using testsupport::valueOf;
 
 // The default chain of the plug-in, written out (device 0, nearest TDO, first).
 constexpr uint32_t kDapId = 0x4BA00477u;   // ARM JTAG-DP, IR 4, IDCODE 0xE, USER 0xA (35 bits)
@@ -43,32 +32,6 @@ inline const std::string kDap = "0x4BA00477:4:idcode=0xE:user=0xA:userbits=35";
 inline const std::string kArtix = "0x0362D093:6:idcode=0x9";
 inline const std::string kEcp5 = "0x41111043:8:idcode=0xE0:user=0x32";
 inline const std::string kThreeDevices = kDap + "," + kArtix + "," + kEcp5;
-
-// ---- bit buffers in the plug-in's order: bit i is bit i%8 of byte i/8 ----------
-
-inline std::vector<uint8_t> bitsOf(uint64_t value, unsigned bits)
-{
-    std::vector<uint8_t> out((bits + 7) / 8, 0);
-    for (unsigned i = 0; i < bits; ++i)
-        if ((value >> i) & 1u) out[i / 8] |= static_cast<uint8_t>(1u << (i % 8));
-    return out;
-}
-
-inline uint64_t valueOf(const std::vector<uint8_t>& buffer, unsigned first, unsigned bits)
-{
-    uint64_t value = 0;
-    for (unsigned i = 0; i < bits; ++i)
-        if ((buffer[(first + i) / 8] >> ((first + i) % 8)) & 1u) value |= uint64_t{1} << i;
-    return value;
-}
-
-// An IDCODE as the C API writes it: 32 '0'/'1' characters, bit 31 first.
-inline std::string idcodeText(uint32_t value)
-{
-    std::string text;
-    for (int bit = 31; bit >= 0; --bit) text += ((value >> bit) & 1u) ? '1' : '0';
-    return text;
-}
 
 class SimSession : public ::testing::Test {
 protected:

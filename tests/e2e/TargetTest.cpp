@@ -112,6 +112,17 @@ TEST_F(E2eTargetTest, FailedOpensLeaveNoTargetAndTellTheHostWhy)
     EXPECT_EQ(3u, deviceCount());
 }
 
+// A waveform that cannot be written (a full disk; /dev/full fails every
+// write) is a failing operation with a message, never a silently cut file.
+TEST_F(E2eTargetTest, AWaveformThatCannotBeWrittenFails)
+{
+    EXPECT_EQ(JEX_FAILURE, open(kThreeDevices, {"vcd=/dev/full"}));
+    const std::vector<std::string> errors = messagesOfType(JEX_MSG_ERROR);
+    ASSERT_EQ(1u, errors.size());
+    EXPECT_EQ("jtag_sim: writing the waveform to /dev/full failed (No space left on device); recording stopped",
+              errors[0]);
+}
+
 TEST_F(E2eTargetTest, WaveformRecordsPinsAndEveryDeviceState)
 {
     const std::string path = (m_dir / "session.vcd").string();

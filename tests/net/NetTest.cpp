@@ -216,12 +216,12 @@ TEST_F(NetTest, ServerFaultsFailTheScanClearlyAndTheNextOpenConnectsAfresh)
     for (const Fault& fault : faults) {
         SCOPED_TRACE(fault.mode);
         messages().clear();
-        ChildProcess server({"python3", kPythonServer, "--chain", kChain, "--fault", fault.mode, "--after", "6000"});
+        ChildProcess server({"python3", kPythonServer, "--chain", kChain, "--fault", fault.mode, "--after", "40000"});
         std::vector<std::string> args = addressArgs(server.listeningAddress());
         args.push_back(std::string("timeout=") + fault.timeout);
         ASSERT_EQ(JEX_SUCCESS, open("remote_bitbang", args));
         std::vector<uint8_t> tdo;
-        EXPECT_EQ(JEX_FAILURE, readDR(12000, tdo));
+        EXPECT_EQ(JEX_FAILURE, readDR(40000, tdo));
         EXPECT_TRUE(messaged(fault.message));
         EXPECT_EQ(JEX_FAILURE, readDR(8, tdo)); // the broken connection stays closed
         EXPECT_TRUE(messaged("open the target again"));

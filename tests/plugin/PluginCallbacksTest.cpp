@@ -21,25 +21,19 @@ using JexRT::Session;
 using testsupport::LogCapture;
 using testsupport::PluginTree;
 
-struct Delivery {
-    unsigned handle;
-    unsigned type;
-    std::string text;
-};
-std::vector<Delivery> g_deliveries;
-void deliver(unsigned handle, unsigned type, const char* text) { g_deliveries.push_back({handle, type, text}); }
+using testsupport::messages;
 
 class PluginCallbacksTest : public ::testing::Test {
 protected:
     void SetUp() override
     {
-        g_deliveries.clear();
+        messages().clear();
         tree.add("acme", "alpha", "test_counting_alpha", {"alpha_usb"});
     }
     unsigned createSession(std::vector<const char*> args = {})
     {
         unsigned h = 0;
-        EXPECT_EQ(JEX_SUCCESS, JexRT::createSession(deliver, static_cast<unsigned>(args.size()), args.data(), &h));
+        EXPECT_EQ(JEX_SUCCESS, JexRT::createSession(testsupport::keepMessage, static_cast<unsigned>(args.size()), args.data(), &h));
         return h;
     }
     // Asks the instance to run one of its callback commands.
@@ -65,23 +59,23 @@ TEST_F(PluginCallbacksTest, APluginMessageReachesTheHostOfTheSessionItNames)
 
     instance->ops->setSessionHandle(instance, second);
     EXPECT_EQ(JEX_SUCCESS, command(instance, "message 1024 hello host"));
-    ASSERT_EQ(1u, g_deliveries.size());
-    EXPECT_EQ(second, g_deliveries[0].handle);
-    EXPECT_EQ(unsigned {JEX_MSG_INFO}, g_deliveries[0].type);
-    EXPECT_EQ("hello host", g_deliveries[0].text);
+    ASSERT_EQ(1u, messages().size());
+    EXPECT_EQ(second, messages()[0].handle);
+    EXPECT_EQ(unsigned {JEX_MSG_INFO}, messages()[0].type);
+    EXPECT_EQ("hello host", messages()[0].text);
 
     // Extra bits reach the same session, which answers with its own handle;
     // every type passes unchanged.
     instance->ops->setSessionHandle(instance, first | 0xAB00FF07u);
     EXPECT_EQ(JEX_SUCCESS, command(instance, "message 7 debug text"));
-    ASSERT_EQ(2u, g_deliveries.size());
-    EXPECT_EQ(first, g_deliveries[1].handle);
-    EXPECT_EQ(7u, g_deliveries[1].type);
+    ASSERT_EQ(2u, messages().size());
+    EXPECT_EQ(first, messages()[1].handle);
+    EXPECT_EQ(7u, messages()[1].type);
 
     // No session with that handle: dropped.
     instance->ops->setSessionHandle(instance, 0x00770000u);
     EXPECT_EQ(JEX_SUCCESS, command(instance, "message 256 nobody listens"));
-    EXPECT_EQ(2u, g_deliveries.size());
+    EXPECT_EQ(2u, messages().size());
 
     Session::m_pluginManager->destroyPluginInstance("alpha_usb", instance);
     JexRT::destroySession(first);

@@ -99,40 +99,6 @@ TEST_F(SessionInternalTest, HostLayerMessagesReachEveryLiveSessionInCreationOrde
     JexRT::destroySession(newer);
 }
 
-TEST_F(SessionInternalTest, HostLayerTypesMapToMessageTypes)
-{
-    using JexRT::PortabilityMessageInterceptor;
-    for (int t : {0, 4, 5, 6, 8}) EXPECT_EQ(JEX_MSG_ERROR, PortabilityMessageInterceptor::mapType(t)) << t;
-    EXPECT_EQ(JEX_MSG_WARNING, PortabilityMessageInterceptor::mapType(1));
-    EXPECT_EQ(JEX_MSG_INFO, PortabilityMessageInterceptor::mapType(2));
-    EXPECT_EQ(JEX_MSG_INFO, PortabilityMessageInterceptor::mapType(7));
-    EXPECT_EQ(JEX_MSG_SILENT, PortabilityMessageInterceptor::mapType(3));
-    for (int t : {-1, 9, 10, 1000}) EXPECT_EQ(JEX_MSG_NOISE, PortabilityMessageInterceptor::mapType(t)) << t;
-}
-
-TEST_F(SessionInternalTest, InterceptorTakesThePlaceOfTheDefaultManagerAndGivesItBack)
-{
-    Port_MsgMan* before = Port_MsgDispatcher::getDefaultMsgMan();
-    {
-        JexRT::PortabilityMessageInterceptor interceptor;
-        EXPECT_FALSE(Port_MsgDispatcher::removeMsgMan(before)); // no longer in the set
-        EXPECT_EQ(&interceptor, Port_MsgDispatcher::getDefaultMsgMan());
-    }
-    EXPECT_TRUE(Port_MsgDispatcher::removeMsgMan(before)); // back in the set
-    Port_MsgDispatcher::addMsgMan(before);
-}
-
-TEST_F(SessionInternalTest, FindSessionAndTarget)
-{
-    const unsigned h = create();
-    ASSERT_NE(nullptr, JexRT::findSession(h));
-    EXPECT_EQ(h, JexRT::findSession(h)->getHandle());
-    EXPECT_EQ(nullptr, JexRT::findSession(h + 0x00010000u));
-    EXPECT_EQ(nullptr, JexRT::findTarget(h | 1u));
-    JexRT::destroySession(h);
-    EXPECT_EQ(nullptr, JexRT::findSession(h));
-}
-
 TEST(VersionNumber, NibblesOfTheDigits)
 {
     EXPECT_EQ(0x9200u, versionNumberFromText("9.2"));

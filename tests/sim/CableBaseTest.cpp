@@ -9,6 +9,7 @@
 #include <vector>
 
 #include "SimTestSupport.hpp"
+#include "jexjtag/cable/BitBuffer.hpp"
 #include "jexjtag/cable/CableBase.hpp"
 
 namespace {
@@ -52,8 +53,8 @@ protected:
 
 TEST(CableBase, ATransportFailureFailsTheOperationAndResetsTheTapNextTime)
 {
-    simtest::Messages::all().clear();
-    const JexPluginCallbacks callbacks = simtest::Messages::callbacks();
+    testsupport::messages().clear();
+    const JexPluginCallbacks callbacks = simtest::hostCallbacks();
     jexjtag::PluginHost::set(&callbacks);
     FlakyCable cable;
     ASSERT_EQ(cable.openTarget(0, nullptr, nullptr), JEX_SUCCESS);
@@ -61,7 +62,7 @@ TEST(CableBase, ATransportFailureFailsTheOperationAndResetsTheTapNextTime)
 
     cable.wire.broken = true;
     EXPECT_EQ(cable.navigateTAP(JEXJTAG_PAUSE_DR, 0), JEX_FAILURE);
-    EXPECT_TRUE(simtest::Messages::contains(JEX_MSG_ERROR, "flaky: the adapter went away"));
+    EXPECT_TRUE(testsupport::sawMessage(JEX_MSG_ERROR, "flaky: the adapter went away"));
 
     cable.wire.broken = false;
     cable.wire.moves.clear();

@@ -14,20 +14,8 @@ namespace {
 const std::string kModule = std::string(JEXJTAG_TEST_BUILD_DIR) + "/lib/plugins/jexjtag/jtag_sim/jtag_sim.so";
 constexpr uint32_t kSession = 0x00010000;
 
-std::vector<std::pair<uint32_t, std::string>> g_messages;
-
-void recordMessage(uint32_t session, uint32_t type, const char* text)
-{
-    EXPECT_EQ(session, kSession);
-    g_messages.emplace_back(type, text ? text : "");
-}
-
-bool sawMessage(uint32_t type, const std::string& part)
-{
-    for (const auto& [t, text] : g_messages)
-        if (t == type && text.find(part) != std::string::npos) return true;
-    return false;
-}
+using testsupport::messages;
+using testsupport::sawMessage;
 
 class PluginAbi : public ::testing::Test {
 protected:
@@ -42,7 +30,7 @@ protected:
         ASSERT_TRUE(create && destroy && loaded && setCallbacks && module->rawSymbol("JexPlugin_unloaded"));
         loaded();
         JexPluginCallbacks callbacks{};
-        callbacks.sendMessage = &recordMessage;
+        callbacks.sendMessage = &testsupport::keepMessage;
         setCallbacks(&callbacks); // the table lives only for this call
     }
     static void TearDownTestSuite()
@@ -52,7 +40,7 @@ protected:
         module = nullptr;
     }
 
-    void SetUp() override { g_messages.clear(); }
+    void SetUp() override { messages().clear(); }
     void TearDown() override
     {
         for (JexPluginInstance* i : instances) destroy(i);
@@ -203,13 +191,14 @@ TEST_F(PluginAbi, CommandsGetAndSetOptions)
     EXPECT_EQ(get(i, "colour"), "<failed>");
     EXPECT_EQ(set(i, "noequals"), JEX_FAILURE);
 
-    g_messages.clear();
+    messages().clear();
     const uint8_t in[] = "x";
     uint32_t len = 0;
     EXPECT_EQ(i->ops->sendCommand(i, "reboot", in, 2, nullptr, &len, nullptr), JEX_FAILURE);
-    ASSERT_EQ(g_messages.size(), 1u);
-    EXPECT_EQ(g_messages[0].first, JEX_MSG_ERROR);
-    EXPECT_NE(g_messages[0].second.find("reboot"), std::string::npos);
+    ASSERT_EQ(messages().size(), 1u);
+    EXPECT_EQ(messages()[0].handle, kSession) << "the message names the instance's session";
+    EXPECT_EQ(messages()[0].type, unsigned{JEX_MSG_ERROR});
+    EXPECT_NE(messages()[0].text.find("reboot"), std::string::npos);
     EXPECT_EQ(i->ops->sendCommand(i, nullptr, in, 2, nullptr, &len, nullptr), JEX_FAILURE);
 }
 

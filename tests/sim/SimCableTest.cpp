@@ -7,7 +7,7 @@
 
 using jexsim::SimCable;
 using jexsim::SimDevice;
-using simtest::bits;
+using simtest::bitsOf;
 
 namespace {
 
@@ -15,8 +15,8 @@ class SimCableTest : public ::testing::Test {
 protected:
     void SetUp() override
     {
-        simtest::Messages::all().clear();
-        const JexPluginCallbacks callbacks = simtest::Messages::callbacks();
+        testsupport::messages().clear();
+        const JexPluginCallbacks callbacks = simtest::hostCallbacks();
         jexjtag::PluginHost::set(&callbacks);
     }
     void TearDown() override { jexjtag::PluginHost::set(nullptr); }
@@ -62,10 +62,10 @@ TEST_F(SimCableTest, ShiftsEndInTheExitState)
 TEST_F(SimCableTest, TdiMaskDrivesMaskedBitsLow)
 {
     open({"chain=0x0362D093:6:idcode=0x9"});
-    const auto user = bits(0x02, 6);
+    const auto user = bitsOf(0x02, 6);
     ASSERT_EQ(cable.shiftDeviceIRWrite(0, user.data(), nullptr, 6, JEXJTAG_RUN_TEST_IDLE, nullptr), JEX_SUCCESS);
-    const auto data = bits(0xFFFFFFFF, 32);
-    const auto mask = bits(0x0000FF0F, 32);
+    const auto data = bitsOf(0xFFFFFFFF, 32);
+    const auto mask = bitsOf(0x0000FF0F, 32);
     ASSERT_EQ(cable.shiftDeviceDRWrite(0, data.data(), mask.data(), 32, JEXJTAG_RUN_TEST_IDLE, nullptr), JEX_SUCCESS);
     EXPECT_EQ(cable.chain()->device(0).userRegister(), 0x0000FF0Fu);
 }
@@ -76,7 +76,7 @@ TEST_F(SimCableTest, DeviceShiftsPadWithTheHeldIrLengths)
     // A wrong IR length for device 2 (between device 1 and TDI) misaligns
     // device 1's instruction, as on a real cable.
     ASSERT_EQ(cable.setIRLength(2, 7), JEX_SUCCESS);
-    const auto user1 = bits(0x02, 6);
+    const auto user1 = bitsOf(0x02, 6);
     ASSERT_EQ(cable.shiftDeviceIRWrite(1, user1.data(), nullptr, 6, JEXJTAG_RUN_TEST_IDLE, nullptr), JEX_SUCCESS);
     EXPECT_EQ(cable.chain()->device(1).instruction(), 0x05u) << "the data sits one bit nearer TDI";
     ASSERT_EQ(cable.setIRLength(2, 8), JEX_SUCCESS);
@@ -93,7 +93,7 @@ TEST_F(SimCableTest, WaveformCanBeStartedAndStoppedByOption)
     ASSERT_EQ(set("vcd=" + path), JEX_SUCCESS);
     ASSERT_EQ(cable.navigateTAP(JEXJTAG_SHIFT_DR, 0), JEX_SUCCESS);
     EXPECT_EQ(set("chain=none:2"), JEX_FAILURE) << "the chain cannot change under a recording";
-    EXPECT_TRUE(simtest::Messages::contains(JEX_MSG_ERROR, "waveform"));
+    EXPECT_TRUE(testsupport::sawMessage(JEX_MSG_ERROR, "waveform"));
     ASSERT_EQ(set("vcd="), JEX_SUCCESS);
     ASSERT_EQ(cable.navigateTAP(JEXJTAG_RUN_TEST_IDLE, 0), JEX_SUCCESS);
 
@@ -115,5 +115,5 @@ TEST_F(SimCableTest, CloseReleasesEverything)
     jexcable::CableLock other("sim0", dir.str());
     EXPECT_TRUE(other.acquire(0));
     EXPECT_EQ(cable.flush(), JEX_FAILURE);
-    EXPECT_TRUE(simtest::Messages::contains(JEX_MSG_ERROR, "not open"));
+    EXPECT_TRUE(testsupport::sawMessage(JEX_MSG_ERROR, "not open"));
 }

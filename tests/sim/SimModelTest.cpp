@@ -3,6 +3,7 @@
 
 #include <random>
 
+#include "jexjtag/cable/BitBuffer.hpp"
 #include "jexjtag/cable/ChainLayout.hpp"
 #include "jexjtag/cable/JtagEngine.hpp"
 #include "SimChain.hpp"
@@ -15,8 +16,8 @@ using jexcable::ShiftSource;
 using jexsim::DeviceSpec;
 using jexsim::SimChain;
 using jexsim::SimDevice;
-using simtest::bits;
-using simtest::value;
+using simtest::bitsOf;
+using simtest::valueOf;
 
 namespace {
 
@@ -65,34 +66,19 @@ TEST(SimModel, EveryUnassignedOpcodeActsAsBypass)
 {
     for (uint64_t opcode = 0; opcode < 16; ++opcode) {
         Bench b({simtest::device(0x4BA00477, 4, 0xE, 0xA, 35)});
-        b.write(IR, bits(opcode, 4), 4);
+        b.write(IR, bitsOf(opcode, 4), 4);
         EXPECT_EQ(b.chain.device(0).instruction(), opcode);
         const auto out = b.read(DR, 40);
         if (opcode == 0xE) {
-            EXPECT_EQ(value(out, 32), 0x4BA00477u);
+            EXPECT_EQ(valueOf(out, 0, 32), 0x4BA00477u);
         } else if (opcode == 0xA) {
-            EXPECT_EQ(value(out, 35), 0u) << "the user register starts cleared";
-            EXPECT_EQ(value(out, 5, 35), 0x1Fu);
+            EXPECT_EQ(valueOf(out, 0, 35), 0u) << "the user register starts cleared";
+            EXPECT_EQ(valueOf(out, 35, 5), 0x1Fu);
         } else {
-            EXPECT_EQ(value(out, 1), 0u) << "opcode " << opcode;
-            EXPECT_EQ(value(out, 39, 1), (uint64_t{1} << 39) - 1) << "opcode " << opcode << ": one-bit register";
+            EXPECT_EQ(valueOf(out, 0, 1), 0u) << "opcode " << opcode;
+            EXPECT_EQ(valueOf(out, 1, 39), (uint64_t{1} << 39) - 1) << "opcode " << opcode << ": one-bit register";
         }
     }
-}
-
-TEST(SimModel, TdoIsReleasedOutsideShiftStatesAndAWireChainPassesTdi)
-{
-    Bench b(threeDevices());
-    EXPECT_TRUE(b.chain.tdo(false)) << "TLR: TDO released, reads high";
-    SimChain wire({});
-    EXPECT_FALSE(wire.tdo(false));
-    EXPECT_TRUE(wire.clock(false, true));
-    JtagEngine engine(wire);
-    const auto data = bits(0x5A, 8);
-    std::vector<uint8_t> out(1, 0);
-    ShiftSink sink = ShiftSink::buffer(out.data());
-    engine.shift(DR, ShiftSource::buffer(data.data()), sink, 8, JEXJTAG_RUN_TEST_IDLE);
-    EXPECT_EQ(out[0], 0x5A);
 }
 
 // The word-wide shift path must behave exactly as clocking bit by bit.

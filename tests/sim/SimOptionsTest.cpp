@@ -66,32 +66,6 @@ TEST(ChainSpec, RejectsWhatNoDeviceCouldBe)
     }
 }
 
-TEST(SimOptions, OpenArgumentsWithDefaultsAndCaseInsensitiveKeys)
-{
-    SimOptions o;
-    EXPECT_EQ(o.port, "sim0");
-    EXPECT_EQ(o.frequencyHz, 10000000u);
-    EXPECT_EQ(o.chain.size(), 3u);
-
-    const char* argv[] = {"PORT=sim7", "Frequency=500k", "chain=none:3", "NEW_FIRMWARE=yes",
-                          "AVOID_FIRMWARE_UPDATE=true", "port=sim8", "type=jtag_sim"};
-    std::string error;
-    std::vector<std::string> ignored;
-    ASSERT_TRUE(o.apply(PluginArgs(7, argv), error, &ignored)) << error;
-    EXPECT_EQ(o.port, "sim8") << "the last occurrence counts";
-    EXPECT_EQ(o.frequencyHz, 500000u);
-    EXPECT_EQ(o.chain.size(), 1u);
-    EXPECT_TRUE(o.newFirmware);
-    EXPECT_EQ(ignored, (std::vector<std::string>{"AVOID_FIRMWARE_UPDATE", "type"}));
-
-    std::string value;
-    ASSERT_TRUE(o.get("Frequency", value));
-    EXPECT_EQ(value, "500000");
-    ASSERT_TRUE(o.get("new_firmware", value));
-    EXPECT_EQ(value, "1");
-    EXPECT_FALSE(o.get("colour", value));
-}
-
 TEST(SimOptions, BadValuesChangeNothing)
 {
     SimOptions o;

@@ -1,16 +1,15 @@
 #pragma once
-// Helpers for the simulated cable's tests: device specs, bit buffers and a
-// recorder of the messages a plug-in sends to its session.
+// Helpers for the simulated cable's tests: device specs and the callbacks
+// that keep the messages a plug-in sends to its session.
 
 #include <cstdint>
 #include <string>
-#include <utility>
 #include <vector>
 
 #include "jexjtag/plugin.hpp"
 
-#include "jexjtag/cable/BitBuffer.hpp"
 #include "DeviceSpec.hpp"
+#include "support/TestSupport.hpp"
 
 namespace simtest {
 
@@ -35,42 +34,15 @@ inline jexsim::DeviceSpec noIdcode(uint32_t irLength, uint64_t capture = 1)
     return d;
 }
 
-// n bits of `value` (bit 0 first) as a buffer.
-inline std::vector<uint8_t> bits(uint64_t value, unsigned n)
-{
-    std::vector<uint8_t> buffer(jexcable::BitBuffer::bytesFor(n), 0);
-    for (unsigned i = 0; i < n; ++i) jexcable::BitBuffer::set(buffer.data(), i, (value >> i) & 1u);
-    return buffer;
-}
+using testsupport::bitsOf;
+using testsupport::valueOf;
 
-inline uint64_t value(const std::vector<uint8_t>& buffer, unsigned n, unsigned offset = 0)
+// Plug-in callbacks that keep what the plug-in sends in testsupport::messages().
+inline JexPluginCallbacks hostCallbacks()
 {
-    uint64_t v = 0;
-    for (unsigned i = 0; i < n; ++i)
-        if (jexcable::BitBuffer::get(buffer.data(), offset + i)) v |= uint64_t{1} << i;
-    return v;
+    JexPluginCallbacks cb{};
+    cb.sendMessage = &testsupport::keepMessage;
+    return cb;
 }
-
-// Collects what the plug-in sends through the host callbacks.
-struct Messages {
-    static std::vector<std::pair<uint32_t, std::string>>& all()
-    {
-        static std::vector<std::pair<uint32_t, std::string>> list;
-        return list;
-    }
-    static void send(uint32_t, uint32_t type, const char* text) { all().emplace_back(type, text ? text : ""); }
-    static JexPluginCallbacks callbacks()
-    {
-        JexPluginCallbacks cb{};
-        cb.sendMessage = &Messages::send;
-        return cb;
-    }
-    static bool contains(uint32_t type, const std::string& part)
-    {
-        for (const auto& [t, text] : all())
-            if (t == type && text.find(part) != std::string::npos) return true;
-        return false;
-    }
-};
 
 } // namespace simtest

@@ -1,7 +1,10 @@
 #pragma once
 // Helpers shared by the tests: temporary directories, environment settings
-// that are restored, and a capture of the library's log.
+// that are restored, a capture of the library's log, the messages a host
+// receives, and bit buffers.
 
+#include <bitset>
+#include <cstdint>
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
@@ -176,5 +179,55 @@ private:
     ScopedEnv m_home;
     ScopedEnv m_data;
 };
+
+// The messages delivered to the host, in order: keepMessage serves as
+// a session's JexMessageCallback and as a plug-in's sendMessage callback.
+struct Message {
+    unsigned handle;
+    unsigned type;
+    std::string text;
+};
+inline std::vector<Message>& messages()
+{
+    static std::vector<Message> list;
+    return list;
+}
+inline void keepMessage(unsigned handle, unsigned type, const char* text)
+{
+    messages().push_back({handle, type, text ? text : ""});
+}
+inline std::vector<std::string> messagesOfType(unsigned type)
+{
+    std::vector<std::string> out;
+    for (const Message& m : messages())
+        if (m.type == type) out.push_back(m.text);
+    return out;
+}
+// True when a message of `type` contains `part`.
+inline bool sawMessage(unsigned type, const std::string& part)
+{
+    for (const std::string& text : messagesOfType(type))
+        if (text.find(part) != std::string::npos) return true;
+    return false;
+}
+
+// Bit buffers as the C API and the plug-ins pass them: bit i is bit i%8 of byte i/8.
+inline std::vector<uint8_t> bitsOf(uint64_t value, unsigned bits)
+{
+    std::vector<uint8_t> out((bits + 7) / 8, 0);
+    for (unsigned i = 0; i < bits; ++i)
+        if ((value >> i) & 1u) out[i / 8] |= static_cast<uint8_t>(1u << (i % 8));
+    return out;
+}
+// `bits` bits of `buffer` from bit `first` on, bit `first` the least significant.
+inline uint64_t valueOf(const std::vector<uint8_t>& buffer, unsigned first, unsigned bits)
+{
+    uint64_t value = 0;
+    for (unsigned i = 0; i < bits; ++i)
+        if ((buffer[(first + i) / 8] >> ((first + i) % 8)) & 1u) value |= uint64_t{1} << i;
+    return value;
+}
+// An IDCODE as the C API writes it: 32 '0'/'1' characters, bit 31 first.
+inline std::string idcodeText(uint32_t value) { return std::bitset<32>(value).to_string(); }
 
 } // namespace testsupport

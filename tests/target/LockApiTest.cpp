@@ -3,6 +3,8 @@
 
 #include <gtest/gtest.h>
 
+#include <type_traits>
+
 #include <string>
 #include <vector>
 
@@ -14,12 +16,15 @@ using testsupport::LogCapture;
 
 namespace {
 
+// Only the object that took a lock releases it: no copies.
+static_assert(!std::is_copy_constructible_v<JexRT::JexJtagTargetLock> &&
+              !std::is_copy_assignable_v<JexRT::JexJtagTargetLock>);
+
 using LockApiTest = RecordingFixture;
 
 TEST_F(LockApiTest, LockTwiceThenUnlock)
 {
     const unsigned h = openTarget();
-    LogCapture log(3);
     unsigned status = 0;
     EXPECT_EQ(JEX_SUCCESS, JexJtag_target_lock(h, 500, &status));
     EXPECT_EQ(unsigned{JEXJTAG_LOCKED_ME}, status);
@@ -34,11 +39,6 @@ TEST_F(LockApiTest, LockTwiceThenUnlock)
 
     EXPECT_EQ((std::vector<std::string>{"lockTarget msWait=500", "unlockTarget"}), calls());
     const std::string hs = std::to_string(h);
-    EXPECT_TRUE(log.has("JexJtag_target_lock() handle=" + hs + ", msWait=500\n"));
-    EXPECT_TRUE(log.has("lockTarget(msWait=500) returning JEX_SUCCESS\n"));
-    EXPECT_EQ(2u, log.count("JexJtag_target_lock() returning status=JEXJTAG_LOCKED_ME\n"));
-    EXPECT_TRUE(log.has("unlockTarget() returning JEX_SUCCESS\n"));
-    EXPECT_TRUE(log.has("JexJtag_target_getLockStatus() returning status=JEXJTAG_UNLOCKED\n"));
 }
 
 TEST_F(LockApiTest, ClosingALockedTargetDoesNotUnlockIt)
@@ -57,41 +57,6 @@ TEST_F(LockApiTest, ClosingALockedTargetDoesNotUnlockIt)
     EXPECT_TRUE(log.has("m_plugin is NULL!\n"));
 }
 
-TEST_F(LockApiTest, DestroyingTheSessionReleasesTheLockFirst)
-{
-    const unsigned h = openTarget();
-    unsigned status = 0;
-    ASSERT_EQ(JEX_SUCCESS, JexJtag_target_lock(h, 1, &status));
-    clearRecord();
-    ASSERT_EQ(JEX_SUCCESS, JexJtag_session_destroy(h));
-    m_handle = kNoSession;
-    const std::vector<std::string> got = calls();
-    ASSERT_GE(got.size(), 3u);
-    EXPECT_EQ("unlockTarget", got[0]);
-    EXPECT_EQ("closeTarget", got[1]);
-    EXPECT_EQ(0u, got[2].find("JexPlugin_destroy"));
-}
-
-TEST_F(LockApiTest, NestedLockObjectsTakeAndReleaseTheLockOnce)
-{
-    const unsigned h = openTarget();
-    {
-        JexRT::JexJtagTargetLock outer(h, JexRT::JexJtagTargetLock::ONE_MINUTE_MAX_WAIT);
-        EXPECT_TRUE(outer.holdsLock());
-        {
-            JexRT::JexJtagTargetLock inner(h, 10);
-            EXPECT_FALSE(inner.holdsLock());
-        }
-        unsigned status = 0;
-        EXPECT_EQ(JEX_SUCCESS, JexJtag_target_getLockStatus(h, &status));
-        EXPECT_EQ(unsigned{JEXJTAG_LOCKED_ME}, status); // the inner one left it held
-    }
-    EXPECT_EQ((std::vector<std::string>{"lockTarget msWait=60000", "unlockTarget"}), calls());
-    unsigned status = 0;
-    EXPECT_EQ(JEX_SUCCESS, JexJtag_target_getLockStatus(h, &status));
-    EXPECT_EQ(unsigned{JEXJTAG_UNLOCKED}, status);
-}
-
 TEST_F(LockApiTest, RefusedLocksLeaveTheTargetUnlockedAndNoTargetThrows)
 {
     const unsigned h = createSession();
@@ -108,11 +73,9 @@ TEST_F(LockApiTest, RefusedLocksLeaveTheTargetUnlockedAndNoTargetThrows)
         JexRT::JexJtagTargetLock refused(h, 5);
         EXPECT_FALSE(refused.holdsLock());
     }
-    LogCapture log(3);
     unsigned status = 0;
     EXPECT_EQ(JEX_FAILURE, JexJtag_target_lock(h, 20, &status));
     EXPECT_EQ(unsigned{JEXJTAG_UNLOCKED}, status);
-    EXPECT_TRUE(log.has("lockTarget(msWait=20) returning JEX_FAILURE\n"));
     EXPECT_EQ(JEX_FAILURE, JexJtag_target_lock(h, 20, nullptr));
     EXPECT_EQ((std::vector<std::string>{"lockTarget msWait=5", "lockTarget msWait=20"}), calls());
 }
@@ -120,7 +83,6 @@ TEST_F(LockApiTest, RefusedLocksLeaveTheTargetUnlockedAndNoTargetThrows)
 TEST_F(LockApiTest, CleanLocksUsesATemporaryUsbCableInstanceAndRefusesWhileATargetIsOpen)
 {
     const unsigned h = createSession();
-    LogCapture log(3);
     EXPECT_EQ(JEX_SUCCESS, JexJtag_target_cleanLocks(h));
     const std::vector<std::string> got = calls();
     ASSERT_EQ(4u, got.size());
@@ -128,9 +90,6 @@ TEST_F(LockApiTest, CleanLocksUsesATemporaryUsbCableInstanceAndRefusesWhileATarg
     EXPECT_EQ("setSessionHandle handle=" + std::to_string(h), got[1]);
     EXPECT_EQ("cleanLocks sessionHandle=" + std::to_string(h), got[2]);
     EXPECT_EQ(0u, got[3].find("JexPlugin_destroy"));
-    EXPECT_NE(std::string::npos,
-              log.text().find("Session::m_pluginManager->createPluginInstance(type=ormund_usbcable), returned 0x"));
-    EXPECT_TRUE(log.has("cleanLocks() returning JEX_SUCCESS\n"));
     // The temporary target object is gone again: a target opens as usual.
     EXPECT_EQ(JEX_FAILURE, JexJtag_target_close(h));
     EXPECT_EQ(JEX_SUCCESS, open("recording"));
@@ -151,9 +110,7 @@ TEST_F(LockApiTest, CleanLocksFailsWhenNoPluginServesTheUsbCable)
 {
     removeModule("RecordingPlugin");
     const unsigned h = createSession();
-    LogCapture log(3);
     EXPECT_EQ(JEX_FAILURE, JexJtag_target_cleanLocks(h));
-    EXPECT_TRUE(log.has("Session::m_pluginManager->createPluginInstance(type=ormund_usbcable), returned NULL\n"));
     for (const std::string& line : record()) EXPECT_EQ(std::string::npos, line.find("JexPlugin_create"));
     EXPECT_EQ(JEX_FAILURE, JexJtag_target_close(h)); // no target object stays behind
 }

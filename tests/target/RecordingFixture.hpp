@@ -8,7 +8,6 @@
 #include <cstdint>
 #include <cstdio>
 #include <algorithm>
-#include <bitset>
 #include <filesystem>
 #include <sstream>
 #include <string>
@@ -20,22 +19,10 @@
 
 namespace targettest {
 
-struct Message {
-    unsigned handle;
-    unsigned type;
-    std::string text;
-};
-
-inline std::vector<Message>& messages()
-{
-    static std::vector<Message> list;
-    return list;
-}
-inline void keepMessage(unsigned handle, unsigned type, const char* text)
-{
-    messages().push_back({handle, type, text ? text : ""});
-}
-
+using testsupport::Message;
+using testsupport::messages;
+using testsupport::idcodeText;
+using testsupport::keepMessage;
 using recording::pointerText;
 
 // A pointer as the library's traces print it: "0x%08llX", or "NULL".
@@ -136,8 +123,5 @@ protected:
     testsupport::ScopedEnv m_config;
     unsigned m_handle = kNoSession;
 };
-
-// The 32-character '0'/'1' text of code, bit 31 first.
-inline std::string bits(unsigned code) { return std::bitset<32>(code).to_string(); }
 
 } // namespace targettest

@@ -30,22 +30,6 @@ TEST(JexUtil, FindKeyIgnoresKeyCaseAndTakesTheLastOccurrence)
     EXPECT_EQ("", Jex_Util::findKey(3, nullptr, "a"));
 }
 
-TEST(JexUtil, TextHelpers)
-{
-    EXPECT_EQ(0, Jex_Util::stricmp("FaLsE", "false"));
-    EXPECT_NE(0, Jex_Util::stricmp("false", "falsey"));
-    EXPECT_EQ(0, Jex_Util::strnicmp("GETX", "getY", 3));
-    EXPECT_EQ("a b", Jex_Util::trimWhitespace(" \t a b\r\n"));
-    EXPECT_EQ("", Jex_Util::trimWhitespace("   "));
-    EXPECT_EQ("plain text", getLocalizedPortMsg(L"plain text"));
-    EXPECT_EQ("", getLocalizedPortMsg(static_cast<const wchar_t*>(nullptr)));
-    EXPECT_STREQ("JEX_SUCCESS", statusText(0));
-    EXPECT_STREQ("JEX_FAILURE", statusText(0x80000000u));
-    EXPECT_STREQ("JEX_FAILURE", statusText(0x80000005u));
-    EXPECT_STREQ("NULL", PointerText(nullptr).c_str());
-    EXPECT_STREQ("0x00001000", PointerText(reinterpret_cast<void*>(0x1000)).c_str());
-}
-
 TEST(JexUtil, TemporaryFilesArePrivateUniqueAndStayInLumenfold)
 {
     TempDir home;

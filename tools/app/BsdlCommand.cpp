@@ -1,8 +1,5 @@
 // The "bsdl" command.
 
-#include <cerrno>
-#include <cstdio>
-#include <cstring>
 #include <vector>
 
 #include "BsdlOutput.hpp"
@@ -31,19 +28,12 @@ Examples:
 
 constexpr unsigned kTextSize = 2048;
 
-// Fails with the system's reason when the file cannot be read at all.
-void checkReadable(const std::string& path)
-{
-    std::FILE* file = std::fopen(path.c_str(), "rb");
-    if (!file) throw CliError("cannot read BSDL file '" + path + "': " + std::strerror(errno));
-    std::fclose(file);
-}
-
 void runBsdl(const Options& options, MessageSink& sink, std::ostream& out)
 {
     BsdlResult result;
     result.file = options.operands.at(0);
-    checkReadable(result.file);
+    // The library opens the file once (a FIFO or pipe has one reader) and
+    // reports why it cannot read it.
     {
         LibrarySession session(options, sink);
         std::vector<char> entity(kTextSize, '\0');

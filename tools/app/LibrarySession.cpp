@@ -21,7 +21,7 @@ constexpr unsigned kNameSize = 1024;
 
 } // namespace
 
-LibrarySession::LibrarySession(const Options& options, MessageSink& sink)
+LibrarySession::LibrarySession(const Options& options, MessageSink& sink) : m_sink(&sink)
 {
     std::vector<std::string> args;
     if (!options.dataDir.empty()) args.push_back("datadir=" + options.dataDir);

@@ -20,6 +20,7 @@ public:
     LibrarySession& operator=(const LibrarySession&) = delete;
 
     unsigned handle() const { return m_handle; }
+    MessageSink& sink() const { return *m_sink; }
 
     // The target types of the loaded plug-ins, in discovery order; the
     // descriptor texts only when withXml.  Throws CliError.
@@ -27,6 +28,7 @@ public:
 
 private:
     unsigned m_handle = 0;
+    MessageSink* m_sink;
 };
 
 } // namespace jexjtag::cli

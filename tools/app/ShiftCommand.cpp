@@ -5,6 +5,7 @@
 #include "ChainReader.hpp"
 #include "CliError.hpp"
 #include "DataText.hpp"
+#include "Idcode.hpp"
 #include "LibrarySession.hpp"
 #include "MessageSink.hpp"
 #include "Options.hpp"
@@ -134,6 +135,25 @@ void fitToInstructionRegister(DataValue& data, const std::string& text, bool len
                    text + " has " + std::to_string(data.bits.size()) + " bits");
 }
 
+// A device shift pads with every other device's BYPASS: each IR length on
+// the chain must be known, or the bits land in the wrong places.
+void requireKnownIRLengths(unsigned handle, unsigned count)
+{
+    for (unsigned i = 0; i < count; ++i) {
+        unsigned irLength = 0;
+        if (JEX_FAILED(JexJtag_tap_getIRLength(handle, i, &irLength)))
+            throw CliError("cannot read the IR length of device " + std::to_string(i));
+        if (irLength != 0 && irLength <= 4096) continue;
+        char bits[33] = {};
+        JexJtag_tap_getDeviceIdcode(handle, i, bits, sizeof bits);
+        const std::optional<uint32_t> idcode = idcodeFromBits(bits);
+        throw CliError("the IR length of device " + std::to_string(i) + " (IDCODE " +
+                       (idcode ? idcodeHex(*idcode) : std::string(bits)) +
+                       ") is unknown: the device list does not know it.  Give it in an idcode.lst of your own "
+                       "(--datadir DIR), or keep the lengths the cable found with --no-autodetect");
+    }
+}
+
 // One shift; TDO comes back.  With tdi not written (read only) TDI stays 0.
 BitVector shift(unsigned handle, bool ir, const std::optional<unsigned>& device, const BitVector& tdi, bool write,
                 unsigned exitState)
@@ -181,6 +201,7 @@ void runShift(const Options& options, MessageSink& sink, std::ostream& out)
             if (device >= count)
                 throw CliError("there is no device " + std::to_string(device) + ": the chain has " +
                                std::to_string(count) + (count == 1 ? " device" : " devices"));
+            requireKnownIRLengths(handle, count);
             if (ir) fitToInstructionRegister(data, dataText, request.bits.has_value(), handle, device);
             if (instruction) fitToInstructionRegister(*instruction, *request.irData, false, handle, device);
         }

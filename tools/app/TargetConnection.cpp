@@ -25,7 +25,7 @@ void checkTypeIsKnown(const LibrarySession& session, const std::string& type)
 } // namespace
 
 TargetConnection::TargetConnection(const LibrarySession& session, const Options& options)
-    : m_handle(session.handle()), m_type(options.targetType)
+    : m_handle(session.handle()), m_sink(&session.sink()), m_type(options.targetType)
 {
     checkTypeIsKnown(session, m_type);
     std::vector<const char*> argv;
@@ -50,11 +50,16 @@ TargetConnection::~TargetConnection()
 void TargetConnection::lock(unsigned msWait)
 {
     unsigned status = JEXJTAG_NOTARGET;
+    m_sink->clearLastError();
     const uint32_t result = JexJtag_target_lock(m_handle, msWait, &status);
     if (!JEX_FAILED(result) && status == JEXJTAG_LOCKED_ME) {
         m_locked = true;
         return;
     }
+    // Say what happened: a lock directory that cannot be used is no holder.
+    const std::string& reason = m_sink->lastError();
+    if (!reason.empty() && reason.find("locked by another process") == std::string::npos)
+        throw CliError("cannot lock target '" + m_type + "': " + reason);
     throw CliError("cannot lock target '" + m_type + "': locked by another process (waited " +
                    std::to_string(msWait) + " ms; --lock-wait MS waits longer, --no-lock skips the lock)");
 }

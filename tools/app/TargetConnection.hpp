@@ -27,6 +27,7 @@ public:
 
 private:
     unsigned m_handle;
+    MessageSink* m_sink;
     std::string m_type;
     bool m_locked = false;
 };

@@ -27,9 +27,10 @@ bool MessageSink::alwaysShown(unsigned msgType)
 
 void MessageSink::deliver(unsigned msgType, const char* text)
 {
-    if (!m_verbose && !alwaysShown(msgType)) return;
     std::string body = text ? text : "";
     while (!body.empty() && (body.back() == '\n' || body.back() == '\r')) body.pop_back();
+    if (msgType == JEX_MSG_ERROR) m_lastError = body;
+    if (!m_verbose && !alwaysShown(msgType)) return;
     m_out << prefixFor(msgType) << body << '\n';
     m_out.flush();
 }

@@ -21,7 +21,13 @@ public:
     static std::string prefixFor(unsigned msgType);
     static bool alwaysShown(unsigned msgType);
 
+    // The text of the last error message delivered since clearLastError()
+    // ("" when none), line ends removed.
+    const std::string& lastError() const { return m_lastError; }
+    void clearLastError() { m_lastError.clear(); }
+
 private:
+    std::string m_lastError;
     std::ostream& m_out;
     bool m_verbose;
 };

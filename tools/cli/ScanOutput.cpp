@@ -17,6 +17,13 @@ std::string displayIdcode(const std::string& bits)
 
 } // namespace
 
+namespace {
+
+// A plug-in answers an IR length as an int: a negative one is no length.
+bool irLengthKnown(unsigned irLength) { return static_cast<int>(irLength) >= 0; }
+
+} // namespace
+
 void writeScanText(std::ostream& out, const ScanResult& result)
 {
     const size_t count = result.devices.size();
@@ -28,7 +35,8 @@ void writeScanText(std::ostream& out, const ScanResult& result)
     TextTable table({true, false, true, false});
     table.addRow({"#", "IDCODE", "IR", "DEVICE"});
     for (const ChainDevice& device : result.devices)
-        table.addRow({std::to_string(device.index), displayIdcode(device.idcodeBits), std::to_string(device.irLength),
+        table.addRow({std::to_string(device.index), displayIdcode(device.idcodeBits),
+                      irLengthKnown(device.irLength) ? std::to_string(device.irLength) : "unknown",
                       device.name.empty() ? "(unknown)" : device.name});
     table.write(out, "  ");
 }
@@ -47,7 +55,8 @@ void writeScanJson(std::ostream& out, const ScanResult& result)
         if (value) json.key("idcode").string(idcodeHex(*value));
         else json.key("idcode").null();
         json.key("idcode_bits").string(device.idcodeBits);
-        json.key("ir_length").number(device.irLength);
+        if (irLengthKnown(device.irLength)) json.key("ir_length").number(device.irLength);
+        else json.key("ir_length").null();
         if (device.name.empty()) json.key("name").null();
         else json.key("name").string(device.name);
         json.key("known").boolean(!device.name.empty());

@@ -165,8 +165,9 @@ protected:
     void attachTransport(JtagTransport& transport);
     JtagTransport* transport() { return m_transport; }
     // Resets the TAPs and interrogates the chain again (a chain that cannot
-    // be interrogated leaves an empty description and a warning).
-    void resetAndInterrogate();
+    // be interrogated leaves an empty description and a warning).  False
+    // when the cable itself failed (its message has gone to the session).
+    bool resetAndInterrogate();
     // Makes a new lock on lockKey() (after a cable changed its key).  False,
     // with nothing changed, while the lock is held.
     bool renewLock();
@@ -200,7 +201,9 @@ private:
 
     bool requireOpen();
     void syncPins();
-    bool interrogateChain(std::string& error);
+    // False with `error` set when the chain cannot be interrogated;
+    // `cableFailed` tells a failing cable from a chain that makes no sense.
+    bool interrogateChain(std::string& error, bool& cableFailed);
     uint32_t shift(Target target, const ShiftSource& in, const ShiftSink& out, uint32_t bitCount,
                    uint32_t exitState, bool needsTdi, bool needsTdo, const void* tdi, const void* tdo);
     void driveTck(bool level);

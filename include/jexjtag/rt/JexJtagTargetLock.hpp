@@ -27,9 +27,9 @@ public:
     JexJtagTargetLock(unsigned handle, unsigned msWait);
     // Unlocks when this object took the lock.
     ~JexJtagTargetLock();
-    JexJtagTargetLock(const JexJtagTargetLock&) = default;
-    // Copies both the handle and whether the lock is to be released.
-    JexJtagTargetLock& operator=(const JexJtagTargetLock&) = default;
+    // Not copyable: only the object that took the lock releases it.
+    JexJtagTargetLock(const JexJtagTargetLock&) = delete;
+    JexJtagTargetLock& operator=(const JexJtagTargetLock&) = delete;
 
     // True when this object took the lock and will release it.
     bool holdsLock() const { return m_locked; }

@@ -1,8 +1,10 @@
 #pragma once
 // Jex_DeviceData - a table of IDCODE list entries.  It reads IDCODE lists
-// from streams and files, keeps its entries sorted so that the most
-// specific pattern, and of equal patterns a caller's entry, comes first, and
-// answers lookups by a 32-bit code with the first entry that matches.
+// from streams and files, keeps its entries sorted by the byte order of
+// their pattern texts ('0' < '1' < 'X', with 'x' taken as 'X'), a caller's
+// entry before an installation's of the same pattern and otherwise in the
+// order read, and answers lookups by a 32-bit code with the first entry
+// that matches.
 //
 // IDCODE list lines (the first line of a list is line 0):
 //
@@ -13,7 +15,8 @@
 // space or commas (the name runs to the next white space or '#' and may
 // hold commas).  '#' starts a comment in the pattern or right after the
 // name; blank and comment-only lines carry no entry.  The three numbers
-// are decimal, at most 2147483647; the name has at least two characters.
+// are decimal, at most 2147483647 (the IR length at most 4096); the name
+// has at least two characters.
 // A bad line throws std::logic_error with the text
 //   "Input error in file: <name> line:<n> - <reason>"
 // where reason is "invalid character in idcode.", "non-digit character in
@@ -43,8 +46,8 @@ public:
 
     // Reads every line of in as an IDCODE list line, appends the entries and
     // sorts the whole table.  fileName only labels error messages.  Throws
-    // std::logic_error at the first bad line; the entries before it stay
-    // (appended, sorted in by the next complete read).
+    // std::logic_error at the first bad line; the entries before it stay,
+    // sorted in.
     void addEntriesFromFile(const char* fileName, std::istream& in, bool userEntry);
     // Reads the named file as above, then the "IDCODELIST" value of the data
     // file that belongs to it (NAME.acd beside NAME.lst), whose ':' stand

@@ -17,6 +17,9 @@
 //                            the capacity as it was (default text)
 //   pin=<number>             what getPin answers (read shifts write 0x5A into tdo)
 //   cmdout=<text>            the answer to any other command
+//   say=op,op                these operations first send their name to the
+//                            session as a warning (the host may call back in)
+//   count=<number>           what getDeviceCount answers (default: the chain)
 
 #include <cstdarg>
 #include <cstdio>
@@ -129,7 +132,7 @@ public:
     uint32_t getDeviceCount() override
     {
         record("getDeviceCount");
-        return static_cast<uint32_t>(m_devices.size());
+        return static_cast<uint32_t>(m_config.number("count", m_devices.size()));
     }
     uint32_t setDeviceCount(uint32_t count) override
     {
@@ -336,6 +339,21 @@ private:
     void record(const char* format, Args... args)
     {
         appendLine(format, args...);
+        say(std::string(format, std::strcspn(format, " ")));
+    }
+    // The shifts name their operation in the first argument.
+    template <typename... Args>
+    void record(const char* format, const char* op, Args... args)
+    {
+        appendLine(format, op, args...);
+        say(op);
+    }
+    void say(const std::string& op)
+    {
+        std::stringstream say(m_config.get("say"));
+        std::string item;
+        while (std::getline(say, item, ','))
+            if (item == op) jexjtag::PluginHost::sendMessage(sessionHandle(), JEX_MSG_WARNING, op.c_str());
     }
 
     void configure()
