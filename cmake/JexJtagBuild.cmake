@@ -11,7 +11,7 @@ endfunction()
 #                    SOURCES ... [OUTPUT_ROOT <dir>] [NO_INSTALL])
 # Builds a plug-in module P.so and lays it out with its descriptor as
 # <root>/<company>/<P>/P.so and P.xml.  The root defaults to the build tree's
-# lib/plugins; shipped plug-ins are installed into the same layout.
+# lib/plugins; shipped plug-ins are installed into <libdir>/jexjtag/plugins.
 function(jexjtag_add_plugin target)
   cmake_parse_arguments(P "NO_INSTALL" "COMPANY;NAME;DESCRIPTOR;OUTPUT_ROOT" "SOURCES" ${ARGN})
   if(NOT P_OUTPUT_ROOT)

@@ -32,6 +32,8 @@ run_suite() {
 }
 
 run_suite "$here/build" -DCMAKE_BUILD_TYPE=RelWithDebInfo
+echo "=== Debian packages"
+"$here/scripts/test-packages.sh" "$here/build-pkg"
 ASAN_OPTIONS=detect_leaks=1 UBSAN_OPTIONS=print_stacktrace=1:halt_on_error=1 \
   run_suite "$here/build-asan" -DCMAKE_BUILD_TYPE=Debug -DJEXJTAG_SANITIZE=ON -DJEXJTAG_BUILD_BENCHMARKS=OFF
 

@@ -23,7 +23,7 @@ unsigned PluginManager::init()
     if (!configured.empty())
         m_pluginRoot = configured;
     else
-        m_pluginRoot = Jex_Util::findLibInPath("libJexJtag") + jexplatform::kPathSeparator + "plugins";
+        m_pluginRoot = Jex_Util::getPluginRootPath();
     return tracer.setReturnStatus(addAllPlugins());
 }
 

@@ -110,7 +110,22 @@ std::string Jex_Util::getDataDirPath()
     }
     const std::string env = jexplatform::environment("JEXJTAG_DATA_DIR");
     if (!env.empty()) return withTrailingSeparator(env);
-    return withTrailingSeparator(findLibInPath("libJexJtag") + "/../share/jexjtag");
+    // <prefix>/lib/libJexJtag.so finds <prefix>/share/jexjtag; a Debian
+    // multiarch library, <prefix>/lib/<triplet>/libJexJtag.so, one level more.
+    const std::string libDir = findLibInPath("libJexJtag");
+    const std::string beside = libDir + "/../share/jexjtag";
+    const std::string multiarch = libDir + "/../../share/jexjtag";
+    if (!jexplatform::isDirectory(beside) && jexplatform::isDirectory(multiarch))
+        return withTrailingSeparator(multiarch);
+    return withTrailingSeparator(beside);
+}
+
+std::string Jex_Util::getPluginRootPath()
+{
+    const std::string libDir = findLibInPath("libJexJtag");
+    const std::string packaged = libDir + "/jexjtag/plugins";
+    if (jexplatform::isDirectory(packaged)) return packaged;
+    return libDir + "/plugins";
 }
 
 void Jex_Util::setUserDataDirPath(const std::string& dir)

@@ -32,8 +32,13 @@ public:
 
     // Installation data directory, always ending in a separator: the one set
     // with setUserDataDirPath, else $JEXJTAG_DATA_DIR, else
-    // <library dir>/../share/jexjtag/.
+    // <library dir>/../share/jexjtag/ (or <library dir>/../../share/jexjtag/
+    // when only that exists: the library in a multiarch lib/<triplet>/).
     static std::string getDataDirPath();
+    // Installation plug-in root (no trailing separator): <library dir>/jexjtag/plugins
+    // when that is a directory (installed packages), else <library dir>/plugins
+    // (the build tree).
+    static std::string getPluginRootPath();
     // Process-wide override of the data directory ("" restores the default).
     static void setUserDataDirPath(const std::string& dir);
 
