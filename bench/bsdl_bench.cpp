@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // BSDL reader throughput: the largest vendor file of the tests and a
 // generated file with a 10,000-cell boundary register, each parsed from the
 // file (read included), from memory, and merely read into memory.  The

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // The jexjtag program as a whole process: start, load the library and its
 // plug-ins, read the device list, do the job, exit.  Each iteration spawns
 // the built program and waits for it; output goes to /dev/null.

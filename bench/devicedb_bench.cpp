@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // Device database speed: session creation with the installation's list,
 // reading a 100,000-line list, and one lookup.
 //

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // Simulated shift throughput end to end: a host's calls through the
 // library's C API (JexJtag_tap_shiftChainDR, JexJtag_tap_shiftDeviceDR) into
 // the jtag_sim plug-in of the build tree, on chains of 3 and 32 devices.

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // Simulated shift throughput of the jtag_sim plug-in, driven through its
 // operation table as the library drives it, on chains of 3 and 32 devices.
 #include <benchmark/benchmark.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // What the library adds to a scan.  Each exported shift and navigate call
 // is timed into the idle plug-in (whose operations return at once) beside a
 // direct call of the same plug-in operation; a counting operator new shows

@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: MIT
 # Project-wide build helpers.
 
 # Warnings every target of ours compiles with.

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 /* demo_host - the smallest useful host of libJexJtag: creates a session,
  * prints the API version and the targets the installed plug-ins offer, and
  * destroys the session. */

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // Feeds arbitrary bytes to the BSDL reader.  The reader must either refuse
 // them (null or Port::Exception) or give a reader whose answers keep their
 // promises; nothing may crash, leak or run away.

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // Fuzz target of the IDCODE list reader: any input either reads or throws
 // the reader's std::logic_error, and whatever is in the table afterwards
 // keeps the table's invariants.

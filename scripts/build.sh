@@ -1,4 +1,5 @@
 #!/usr/bin/env bash
+# SPDX-License-Identifier: MIT
 # Configures and builds one build tree.
 #   scripts/build.sh <build dir> [extra cmake arguments...]
 set -euo pipefail

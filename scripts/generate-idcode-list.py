@@ -1,4 +1,5 @@
 #!/usr/bin/env python3
+# SPDX-License-Identifier: MIT
 """Generate data/idcode.lst, the IDCODE list that libJexJtag installs.
 
 The list is compiled from public device data that Debian packages carry:

@@ -1,4 +1,5 @@
 #!/usr/bin/env bash
+# SPDX-License-Identifier: MIT
 # Builds the libFuzzer targets (clang, separate build directory) when needed
 # and runs every fuzzer found in <builddir>/fuzz for $FUZZ_SECONDS seconds
 # (default 60) on its seed corpus: the directories listed in

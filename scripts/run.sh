@@ -1,4 +1,5 @@
 #!/usr/bin/env bash
+# SPDX-License-Identifier: MIT
 # Sets everything up, builds the library with its plug-ins and runs the main
 # job on the built-in simulated cable: jexjtag scan prints its chain.
 set -euo pipefail

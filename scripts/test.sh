@@ -1,4 +1,5 @@
 #!/usr/bin/env bash
+# SPDX-License-Identifier: MIT
 # Sets everything up and runs every test twice: a normal build, and an
 # AddressSanitizer + UndefinedBehaviorSanitizer build.  Then runs each fuzzer
 # for FUZZ_SECONDS (default 60) when there are any.

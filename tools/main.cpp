@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // jexjtag: the command-line program of libJexJtag.
 
 #include <iostream>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // JexRT.hpp - the C++ class interface of libJexJtag, for hosts that link
 // against it as a class library.  Everything here is in namespace JexRT

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 /*
  * db.h - the session's device database and BSDL import.
  *

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 /*
  * export.h - symbol visibility for libJexJtag.
  *

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 /*
  * jexjtag.h - the C API of libJexJtag.
  *

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 /*
  * plugin.h - the plug-in ABI of libJexJtag.
  *

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 /*
  * plugin.hpp - a small C++ helper for plug-in authors.
  *

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 /*
  * session.h - sessions, the target list and messages.
  *

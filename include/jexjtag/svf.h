@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 /*
  * svf.h - playing Serial Vector Format (SVF) files on a session's target.
  *

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 /*
  * tap.h - TAP navigation, register shifts and chain configuration.
  *

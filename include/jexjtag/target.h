@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 /*
  * target.h - opening, closing, commanding and locking a session's target.
  *

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 /*
  * types.h - statuses, handles, message types and the records and
  * enumerations shared by the C API and the plug-in ABI.

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "jexjtag/cable/CableLock.hpp"
 
 #include <algorithm>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "jexjtag/cable/ChainScanner.hpp"
 
 #include <string>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // POSIX implementation of PluginPlatform.
 #include "jexjtag/cable/PluginPlatform.hpp"
 

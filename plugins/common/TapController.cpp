@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "jexjtag/cable/TapController.hpp"
 
 #include <array>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "jexjtag/cable/TextCopy.hpp"
 
 #include <algorithm>

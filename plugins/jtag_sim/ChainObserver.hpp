@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // Watches a simulated chain clock by clock (the waveform recorder does).
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "ChainSpec.hpp"
 
 #include <cctype>

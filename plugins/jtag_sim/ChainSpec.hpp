@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // The text form of a simulated chain, as the "chain" open argument and
 // option give it:

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // The make-up of one simulated TAP: what the hardware is, not what a driver
 // believes about it.

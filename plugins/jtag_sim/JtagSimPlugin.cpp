@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // Entry points of the jtag_sim plug-in module.
 #include "SimCable.hpp"
 

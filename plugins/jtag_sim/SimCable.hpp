@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // The simulated JTAG cable: a plug-in instance of target type "jtag_sim".
 //

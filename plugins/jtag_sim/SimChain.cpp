@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "SimChain.hpp"
 
 #include "jexjtag/cable/PluginPlatform.hpp"

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // A simulated scan chain: TDI enters the last device, each device's TDO
 // feeds the device before it, and device 0's TDO is the chain's TDO (device

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "SimDevice.hpp"
 
 #include "SimPart.hpp"

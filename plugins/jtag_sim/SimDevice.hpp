@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // One simulated IEEE 1149.1 device: its own TAP controller, an instruction
 // register, and three data registers:

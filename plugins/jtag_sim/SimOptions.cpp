@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "SimOptions.hpp"
 
 #include "ChainSpec.hpp"

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // Records what a simulated cable drives as a Value Change Dump (IEEE 1364
 // VCD) that GTKWave and other waveform viewers open.

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // The boundary of every exported function: no exception leaves the library.
 // An exception that reaches it is logged at level 1 and becomes JEX_FAILURE.

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // Exported BSDL import: the device name, IR length, IDCODE text and BYPASS
 // opcode of a BSDL file or of a BSDL text in memory.
 

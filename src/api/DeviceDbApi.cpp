@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // Exported device-database functions: a host's own IDCODE lists and device
 // lookups by IDCODE text, and the JexRT functions behind them.
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // Exported lock functions: take, release and query the cross-process
 // target lock, and clean stale locks of the USB cable type.
 

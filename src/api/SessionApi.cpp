@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // Exported session functions: version, create and destroy, the plug-in
 // search path, the target list, and messages to the host.
 

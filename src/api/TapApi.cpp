@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // Exported TAP functions: chain configuration, navigation and the four
 // register shifts.
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // Exported target functions: open and close, commands and options, pins,
 // waiting and the target information record.
 

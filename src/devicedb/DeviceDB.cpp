@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "jexjtag/rt/DeviceDB.hpp"
 
 #include <stdexcept>

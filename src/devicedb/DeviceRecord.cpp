@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "jexjtag/rt/DeviceRecord.hpp"
 
 #include "jexjtag/rt/Jex_Exception.hpp"

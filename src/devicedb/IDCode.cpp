@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "jexjtag/rt/IDCode.hpp"
 
 #include <algorithm>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "jexjtag/rt/Jex_DeviceData.hpp"
 
 #include <algorithm>

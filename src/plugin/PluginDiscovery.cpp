@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // PluginManager: discovery of the plug-ins in the plug-in tree.
 //
 //   <root>/<company>/<P>/P.xml   the descriptor, the plug-in's key

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // PluginManager: the target list as hosts see it.  The description of a
 // target is its plug-in's descriptor file, read whole at each call.
 

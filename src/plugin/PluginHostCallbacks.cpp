@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "plugin/PluginHostCallbacks.hpp"
 
 #include "session/Session.hpp"

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // The table of host functions handed to every plug-in module through
 // JexPlugin_setCallbacks: messages to a session's host, and the library's log.

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // PluginManager: construction, module loading and unloading, instances.
 
 #include "plugin/PluginManager.hpp"

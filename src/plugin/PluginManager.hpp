@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // PluginManager - the one owner of the plug-in modules of the process.
 //

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // PluginModule - the record of one plug-in module: its loaded library, its
 // names and paths, the target types it serves and its five entry points.

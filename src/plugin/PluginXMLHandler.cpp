@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "plugin/PluginXMLHandler.hpp"
 
 #include <xercesc/sax/SAXException.hpp>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // PluginXMLHandler - SAX2 content handler that collects the target names of
 // a plug-in descriptor:

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "plugin/PluginXMLInfo.hpp"
 
 #include <memory>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // getPluginXMLInfo - reads the target names of one plug-in descriptor.
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "session/InternalSessionMessageListener.hpp"
 
 #include <string>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // A session's entry in the MessageManager: hands every broadcast message to
 // its session's sendMessage.

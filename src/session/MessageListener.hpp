@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // Receiver of the messages the MessageManager broadcasts.
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // The process-wide message manager: the listeners of all live sessions, and
 // the interceptor that brings the host layer's messages to them.  Created on

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // The library's message manager inside the host layer's dispatcher.  It
 // stands in place of the dispatcher's previous default manager and turns

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // Session - what a session handle stands for: the host's callback and
 // arguments, the session's message listener, its plug-in search path, and

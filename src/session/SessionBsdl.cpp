@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // BSDL import of a session: the device facts of a BSDL file or text, read
 // with the BSDL reader.  Errors go to the host as JEX_MSG_ERROR messages.
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // The session's device-database operations: a caller's IDCODE lists and
 // lookups by IDCODE.
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // The session registry: owns the live sessions, hands out their handles and
 // resolves a handle to its session or target in constant time.

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // The session's target slot: at most one Target, at index 0.
 
 #include <new>

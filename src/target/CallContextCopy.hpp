@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // Each layer hands the next a pointer to its own copy of the call context.
 

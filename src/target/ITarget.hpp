@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // ITarget - every operation a host can ask of a target, in slot order.
 //

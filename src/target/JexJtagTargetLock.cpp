@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "jexjtag/rt/JexJtagTargetLock.hpp"
 
 #include "jexjtag/target.h"

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "jexjtag/rt/Jex_AbortException.hpp"
 
 namespace JexRT {

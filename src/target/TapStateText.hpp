@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // TapStateText - the name a trace prints for a TAP state value, without
 // heap allocation.  Build one only when the level that prints it is on.

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "target/Target.hpp"
 
 #include "jexjtag/rt/IDCode.hpp"

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // Target - the object a session keeps in its target slot.  It guards its
 // implementation (a Vivedoru10TargetImpl): without one every operation

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "target/Vivedoru10TargetImpl.hpp"
 
 #include <cstring>

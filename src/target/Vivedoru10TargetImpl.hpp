@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // Vivedoru10TargetImpl - the target implementation behind a Target: it owns
 // the link to one plug-in instance (m_plugin, null while closed) and

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "bsdl/BsdlDiagnostics.hpp"
 
 #include <cwchar>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // BsdlDiagnostics - how the BSDL reader reports what it finds wrong with a
 // file.  Errors end the reading as a Port::Exception; warnings (oddities the

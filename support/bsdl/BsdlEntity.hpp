@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // BsdlEntity - what the reader takes from a BSDL entity.
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "bsdl/BsdlInstructionTable.hpp"
 
 #include "bsdl/BsdlText.hpp"

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // BsdlInstructionTable - the instructions of an INSTRUCTION_OPCODE attribute:
 // each name with its opcodes in the order declared, for example

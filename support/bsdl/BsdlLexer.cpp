@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "bsdl/BsdlLexer.hpp"
 
 #include <cstring>

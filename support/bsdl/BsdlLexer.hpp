@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // BsdlLexer - splits a BSDL text into VHDL tokens.
 //

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "bsdl/BsdlParser.hpp"
 
 #include "bsdl/BsdlText.hpp"

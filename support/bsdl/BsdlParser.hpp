@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // BsdlParser - reads the entity of a BSDL text (IEEE 1149.1 Annex B, with the
 // IEEE 1149.6 additions as vendors ship them) and keeps what the library asks

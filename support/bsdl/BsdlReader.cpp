@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "bsdl/BsdlReader.hpp"
 
 #include <cerrno>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // BsdlReader - reads a BSDL file (IEEE 1149.1 boundary-scan description) and
 // answers the questions the library asks about the device: its entity name,

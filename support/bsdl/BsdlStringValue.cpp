@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "bsdl/BsdlStringValue.hpp"
 
 #include <algorithm>

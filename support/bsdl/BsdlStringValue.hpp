@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // BsdlStringValue - the text of a string expression ("a" & "b" & ...) as one
 // string, remembering on which line each literal stood so that a problem

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // Small text helpers shared by the BSDL reader's classes.  VHDL (and so
 // BSDL) identifiers and keywords are case-insensitive, and only ASCII

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // One lexical element of a BSDL (VHDL subset) text.
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // StaticAcdRead - reader of the installation data file that belongs to an
 // IDCODE list.  For a list NAME.lst the data file is NAME.acd beside it: a

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "hostlayer/PortException.hpp"
 
 #include <utility>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // The exception class of the host layer and the libraries built on it: it
 // carries a wide-character message.

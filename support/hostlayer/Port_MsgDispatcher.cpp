@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "hostlayer/Port_MsgDispatcher.hpp"
 
 #include <algorithm>

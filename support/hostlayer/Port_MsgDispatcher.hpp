@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // The host layer's dispatcher: a set of message managers, one of them the
 // default.  Every message raised in the host layer goes to every manager in

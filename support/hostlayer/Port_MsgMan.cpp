@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "hostlayer/Port_MsgMan.hpp"
 
 #include <cwchar>

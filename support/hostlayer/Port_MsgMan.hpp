@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // A message manager of the host layer: receives every message raised inside
 // the host layer and the libraries built on it (the BSDL reader, for one).

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // The host layer's default message manager: prints each message on
 // standard error as "<name>: <kind>: <text>".

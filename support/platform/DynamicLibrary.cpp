@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "platform/DynamicLibrary.hpp"
 
 #include <dlfcn.h>

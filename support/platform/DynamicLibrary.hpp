@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // A loaded dynamic library: move-only owner of the loader handle.
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // File-system services of the platform: the only place that lists
 // directories, checks access and creates private files.

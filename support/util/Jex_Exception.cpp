@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "jexjtag/rt/Jex_Exception.hpp"
 
 Jex_Exception::~Jex_Exception() = default;

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "util/Jex_Util.hpp"
 
 #include <cctype>

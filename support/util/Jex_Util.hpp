@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // Jex_Util - argument, text and directory helpers of the library.
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "util/MethodLogger.hpp"
 
 void MethodLogger::traceExit() const

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // MethodLogger - traces one call: entry when named, exit (with the status it
 // was told) when destroyed.  Written at level 4.  With that level off a

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // Small texts for trace lines, built without heap allocation.  Build them
 // only when the log level that prints them is enabled.

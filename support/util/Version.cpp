@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "util/Version.hpp"
 
 #include "util/VersionInfo.hpp"

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 /* A host written in C that knows the library only by file name: it dlopen()s
  * libJexJtag.so, resolves the session functions by name, and creates,
  * messages and destroys sessions. */

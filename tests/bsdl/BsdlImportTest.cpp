@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // BSDL import through the exported C functions, as a host sees it: values,
 // messages, buffer rules, trace lines and the temporary copy in
 // $HOME/.lumenfold.

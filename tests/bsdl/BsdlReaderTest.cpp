@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // The BSDL reader against real vendor files (MANIFEST.tsv gives what each
 // must yield), good/wrong fixture pairs, and hostile inputs.
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // The vendor files in data/ and what MANIFEST.tsv says each must yield.
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // Records every message raised through the host layer's dispatcher while it
 // lives, and keeps the default printer quiet meanwhile.

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // The command line, parsed with the program's command table: options,
 // operands, values and the usage errors.
 

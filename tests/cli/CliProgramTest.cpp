@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // The built jexjtag program, run as a process against the simulated cable.
 
 #include <gtest/gtest.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // Bit buffers, the data notation of shift and the IDCODE notation.
 
 #include <gtest/gtest.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // The JSON writer: escaping and UTF-8 repair (the layout of whole documents
 // shows in the program tests, which parse every --json output strictly).
 

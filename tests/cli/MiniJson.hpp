@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // A strict little JSON reader for the tests: it checks that a text is one
 // valid JSON document in valid UTF-8 and gives access to its values.

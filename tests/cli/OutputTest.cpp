@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // What each command prints, as text and as JSON, and how library messages
 // and help texts look.
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // Runs the built jexjtag program as a child process, with the environment
 // the runner sets, and collects its exit status, standard output and

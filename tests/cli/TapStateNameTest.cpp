@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // TAP state names accepted by --exit.
 
 #include <gtest/gtest.h>

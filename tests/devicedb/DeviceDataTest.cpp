@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // IDCODE list lines, the entry table's order and lookups, named files with
 // their .acd data file.
 

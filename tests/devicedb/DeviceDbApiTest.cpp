@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // The device database as a host sees it: the exported JexJtag_db_*
 // functions and the JexRT lookups.
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // DeviceDB and DeviceRecord, the session's device operations, and where a
 // session finds its idcode.lst.
 

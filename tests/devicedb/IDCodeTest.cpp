@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // IDCode: text and number forms, bit access and pattern comparison.
 
 #include <gtest/gtest.h>

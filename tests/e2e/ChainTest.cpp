@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // The simulated chain end to end through the C API: the road of a typical
 // host, autodetection against the shipped idcode.lst, device-relative and
 // whole-chain shifts, the user register and pin-level TAP walking.

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // The cable lock end to end: two processes contending for one simulated
 // port, the lock's release when its holder is killed, and JexJtagTargetLock
 // objects nesting over two sessions of one process.

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // End-to-end fixture: a session of the library reaching the jtag_sim plug-in
 // as it lies in the build tree (build/lib/plugins), with the build's

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // The simulated cable as a target end to end: options and target
 // information, the firmware-update guard, failures reaching the host, and
 // the VCD waveform the cable records.

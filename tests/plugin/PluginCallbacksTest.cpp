@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // The host callback table as a plug-in sees it.
 
 #include <gtest/gtest.h>

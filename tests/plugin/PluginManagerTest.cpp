@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // PluginManager on real modules in real per-test plug-in trees: loading and
 // its entry-point checks, discovery, instances, unloading and the target list.
 

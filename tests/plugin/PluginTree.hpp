@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // A real plug-in tree for one test: <root>/<company>/<P>/P.so and P.xml,
 // with modules copied from the test modules built in JEXJTAG_TEST_MODULE_DIR

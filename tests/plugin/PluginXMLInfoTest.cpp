@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // The descriptor reader, on the good-* and wrong-* descriptors in
 // data/descriptors/.
 

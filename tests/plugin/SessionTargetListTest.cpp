@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // The target list through the exported session functions of libJexJtag.so,
 // and the plug-in modules' life with the sessions.
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // Sessions through the exported C functions, as a host sees them.
 
 #include <gtest/gtest.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // The registry's listeners and the message path from the host layer, seen
 // from inside the library.
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // The cross-process cable lock: file names, directories and cleaning of
 // stale lock files.  Contention between processes, and release when the
 // holder is killed, are tested end to end (tests/e2e/LockTest.cpp).

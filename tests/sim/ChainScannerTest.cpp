@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // Chain interrogation: IDCODEs, device count and the IR-length heuristic.
 #include <gtest/gtest.h>
 

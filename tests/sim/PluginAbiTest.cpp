@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // The built jtag_sim module, loaded as the library loads it and driven only
 // through its entry points and operation table.
 #include <gtest/gtest.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // The cable instance linked directly: states and registers behind the ABI.
 #include <gtest/gtest.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // The simulated devices and chain, driven through the cable's TAP logic.
 #include <gtest/gtest.h>
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // Open arguments, options and the text form of a chain.
 #include <gtest/gtest.h>
 

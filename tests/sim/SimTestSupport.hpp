@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // Helpers for the simulated cable's tests: device specs and the callbacks
 // that keep the messages a plug-in sends to its session.

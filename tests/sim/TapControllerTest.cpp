@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // The 16-state TAP controller and its shortest TMS paths.
 #include <gtest/gtest.h>
 

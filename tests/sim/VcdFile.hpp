@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // A VCD file read back token by token, for the waveform tests of the
 // simulated cable (tests/sim and tests/e2e).

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // The waveform file: a well-formed VCD that follows what was driven.
 #include <gtest/gtest.h>
 

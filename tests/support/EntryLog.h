@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 /*
  * EntryLog.h - lets a test module record the entry points and operations it
  * receives, for C and C++ modules alike.

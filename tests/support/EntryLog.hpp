@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // Reads back what test modules recorded with tests/support/EntryLog.h.
 // Construct one per test: it points JEXJTAG_TEST_ENTRY_LOG at a fresh file

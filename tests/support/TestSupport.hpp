@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // Helpers shared by the tests: temporary directories, environment settings
 // that are restored, a capture of the library's log, the messages a host

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // The cross-process target lock: the exported lock functions, the scoped
 // JexJtagTargetLock, and cleaning stale locks.
 

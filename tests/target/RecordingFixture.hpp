@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // A test fixture around the recording plug-in: a private plug-in tree with
 // both recording modules, a record file, a session whose messages are kept,

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // Navigation, shifts and chain configuration through the exported TAP
 // functions, checked against what reached the recording plug-in.
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // Opening, closing, commanding and querying a target through the exported
 // functions, checked against what reached the recording plug-in.
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // The host layer's dispatcher and its default manager.
 
 #include <gtest/gtest.h>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // The utility layer: argument lookup, texts, private temporary files and the
 // logger's sink.
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // The program: parses the command line, runs one command, maps failures to
 // the exit status (0 success, 1 operation failed, 2 usage error).

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "ChainReader.hpp"
 
 #include <string>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // Detects the chain of an open target and reads what the library knows
 // about each device.

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "LibrarySession.hpp"
 
 #include <vector>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // One library session for the program's run: created with the message
 // callback that shows the library's messages, destroyed at the end.

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // The "lookup" command.
 
 #include "CliError.hpp"

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // The "scan" command.
 
 #include "ChainReader.hpp"

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // The open target of a session: opened by type name with the open
 // arguments, optionally locked; unlocked and closed at the end.

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // The "targets" command.
 
 #include "LibrarySession.hpp"

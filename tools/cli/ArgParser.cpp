@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "ArgParser.hpp"
 
 #include "UsageError.hpp"

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "BitVector.hpp"
 
 namespace jexjtag::cli {

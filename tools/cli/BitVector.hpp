@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // A run of bits in the order the cable plug-ins use: bit i is bit (i % 8) of
 // byte (i / 8), and bit 0 is shifted first (it is the bit nearest TDO).

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "BsdlOutput.hpp"
 
 #include "Idcode.hpp"

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // An operation that failed (the library refused, a file is missing, ...):
 // exit status 1.

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "Command.hpp"
 
 namespace jexjtag::cli {

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // One command of jexjtag: everything the program knows about it, in one
 // entry.  The parser, the help texts and the dispatch all read these

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "DataText.hpp"
 
 #include <vector>

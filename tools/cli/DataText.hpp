@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // Register data as written on the command line, and TDO written back in the
 // same notation.

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "HelpText.hpp"
 
 namespace jexjtag::cli {

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // The program's overview (the page of --help without a command) and the
 // hint after a usage error.  Each command's own page is in its entry.

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // IDCODEs on the command line and in output: 0x0362D093 for people, 32
 // binary digits (most significant first) for the library.

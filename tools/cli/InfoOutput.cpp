@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "InfoOutput.hpp"
 
 #include <cstdio>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // A small streaming JSON writer: objects, arrays, strings, numbers, booleans
 // and null, indented by two blanks per level.  Strings are escaped, and

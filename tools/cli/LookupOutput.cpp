@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "LookupOutput.hpp"
 
 #include "Idcode.hpp"

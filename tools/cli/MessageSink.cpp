@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "MessageSink.hpp"
 
 #include "jexjtag/types.h"

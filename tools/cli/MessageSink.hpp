@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // Shows the library's messages on a stream (stderr), one line each, with a
 // prefix by type.  Errors, warnings, status and info are always shown;

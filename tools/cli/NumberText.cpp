@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "NumberText.hpp"
 
 #include <cstdint>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // Strict reading of unsigned decimal numbers from the command line.
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "ScanOutput.hpp"
 
 #include "Idcode.hpp"

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "ShiftOutput.hpp"
 
 #include "JsonWriter.hpp"

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // The result of "shift": TDO, in the notation the data was written in.
 

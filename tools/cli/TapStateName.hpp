@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // Names of the sixteen TAP controller states, as the program accepts and
 // prints them.

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #include "TargetsOutput.hpp"
 
 #include "JsonWriter.hpp"

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // Columns of text lined up with two blanks between them.  Columns marked
 // right-aligned are padded on the left (numbers); the last column is never

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // A command line that cannot be carried out as written: exit status 2.
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 /*
  * IdleCable - a plug-in whose operations return at once, for measuring what
  * the library adds to a call.  Plain C against the public ABI header only.

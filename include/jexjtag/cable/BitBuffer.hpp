@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // Bit access to the buffers of the plug-in ABI: bit i of a buffer is bit
 // (i % 8) of byte (i / 8), and bit 0 is shifted first.  Word functions move up

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // A cross-process lock on one cable, identified by its port.
 //

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // What a cable driver believes about its chain: per device (index 0 nearest
 // TDO) the IDCODE (0 when the device has none) and the IR length.  Filled by

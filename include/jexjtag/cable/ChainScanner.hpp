@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // Interrogates a JTAG chain the way a cable driver does, through JtagEngine:
 //

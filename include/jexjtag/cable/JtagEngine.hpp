@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // The TAP logic of a cable driver: follows the state that it drives the
 // chain's TAP controllers into and turns navigation and register shifts into

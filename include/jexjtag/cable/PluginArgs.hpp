@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // The open arguments of a plug-in instance: NUL-terminated "key=value"
 // texts.  Keys compare without regard to case; when a key occurs more than

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // The operating-system calls of the cable plug-ins: environment, private
 // directories, lock files with whole-file advisory locks, sleeping and a

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // Where the TDO bits of a shift go: nowhere, or a buffer (bit order of
 // BitBuffer) with an optional mask.  A bit outside the mask (mask bit 0) is

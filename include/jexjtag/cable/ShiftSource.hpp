@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // Where the TDI bits of a shift come from: a constant level, or a buffer
 // (bit order of BitBuffer) with an optional mask.  A bit outside the mask

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // The IEEE 1149.1 TAP controller: sixteen states moved by TMS on each rising
 // edge of TCK, and the shortest TMS sequence between any two states.

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // Copies text into the fixed buffers of the plug-in ABI.
 

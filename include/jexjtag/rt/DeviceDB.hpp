@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // DeviceDB - the device database of a session: a Jex_DeviceData table filled
 // from the installation's "idcode.lst" when the session starts and from

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // DeviceRecord - the answer of the device database for one IDCODE: a small
 // handle on the matching entry.  The record does not own the entry; it is

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // Device-database functions of the JexRT class interface: a session's own
 // IDCODE lists and device lookups by IDCODE.  Each returns JEX_SUCCESS or

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // IDCode - a JTAG IDCODE carried as text: one character per bit, the most
 // significant bit first.  '0' and '1' are bit values; an upper-case 'X' is

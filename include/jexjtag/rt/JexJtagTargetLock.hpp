@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // JexJtagTargetLock - holds the cross-process lock of a target for the
 // lifetime of the object.

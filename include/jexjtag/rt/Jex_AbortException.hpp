@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // Jex_AbortException - thrown by JexJtagTargetLock when its handle reaches
 // no target; its message is "Jex abort command".

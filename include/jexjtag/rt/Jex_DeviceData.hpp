@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // Jex_DeviceData - a table of IDCODE list entries.  It reads IDCODE lists
 // from streams and files, keeps its entries sorted by the byte order of

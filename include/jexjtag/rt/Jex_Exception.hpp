@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // Jex_Exception - the exception the library's classes throw.  The exported
 // C functions never let it (or any other exception) escape; hosts that use

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // Jex_OneDeviceData - one entry of an IDCODE list: a 32-bit IDCODE pattern
 // with don't-care positions, the device's instruction-register length, two

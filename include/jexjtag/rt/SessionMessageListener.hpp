@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // SessionMessageListener - implemented by a host to hear of sessions being
 // created and destroyed (register with JexRT::addSessionMessageListener).

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // Session functions of the JexRT class interface, for hosts that link
 // against libJexJtag as a class library.  Each returns JEX_SUCCESS or

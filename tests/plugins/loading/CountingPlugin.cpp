@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // A test module built on jexjtag::PluginBase that records every entry point
 // it receives (tests/support/EntryLog.h) and, through its sendCommand
 // operation, calls the host callbacks on request:

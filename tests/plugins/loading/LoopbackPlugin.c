@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 /*
  * A plug-in written in plain C against jexjtag/plugin.h alone: a "cable"
  * that opens, closes, describes itself and keeps its session handle.

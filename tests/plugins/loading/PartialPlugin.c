@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 /*
  * A test module in C whose entry points can be left out one by one
  * (OMIT_CREATE, OMIT_DESTROY, OMIT_LOADED, OMIT_UNLOADED,

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 #pragma once
 // How the recording test plug-in writes the values it receives, shared with
 // the tests that read its record.

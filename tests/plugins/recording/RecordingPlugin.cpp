@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: MIT
 // A cable plug-in for tests.  It drives no hardware: it appends one line per
 // entry point and operation, with the arguments it received in order, to the
 // file named by $JEXJTAG_RECORDING_FILE, and answers as configured.
