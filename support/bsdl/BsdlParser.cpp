@@ -320,23 +320,29 @@ void BsdlParser::parseInstructionLength(unsigned line)
     expectDelimiter(";", "the end of INSTRUCTION_LENGTH");
 }
 
-void BsdlParser::parseIdcode(unsigned line)
+std::string BsdlParser::readBitPattern(const BsdlStringValue& value, const char* attribute)
 {
-    BsdlStringValue value;
-    readStringExpression(value, "IDCODE_REGISTER");
     std::string bits;
     const std::string& text = value.text();
     for (size_t i = 0; i < text.size(); ++i) {
         const char c = text[i];
         if (c == ' ' || c == '\t') continue;
         if (c != '0' && c != '1' && c != 'X' && c != 'x')
-            m_diagnostics.error(value.lineAt(i), "IDCODE_REGISTER may hold only 0, 1 and X, found " +
+            m_diagnostics.error(value.lineAt(i), std::string(attribute) + " may hold only 0, 1 and X, found " +
                                                      quoted(std::string_view(&text[i], 1)));
         bits += c;
     }
+    return bits;
+}
+
+void BsdlParser::parseIdcode(unsigned line)
+{
+    BsdlStringValue value;
+    readStringExpression(value, "IDCODE_REGISTER");
+    std::string bits = readBitPattern(value, "IDCODE_REGISTER");
     if (bits.size() != 32)
         m_diagnostics.error(line, "IDCODE_REGISTER must have 32 bits, found " + std::to_string(bits.size()));
-    if (bits.back() == '0')
+    if (!bits.empty() && bits.back() == '0')
         m_diagnostics.warning(line, "bit 0 of IDCODE_REGISTER is 0; IEEE 1149.1 requires 1");
     m_entity->idcode = std::move(bits);
 }
@@ -352,16 +358,7 @@ void BsdlParser::parseInstructionCapture(unsigned line)
 {
     BsdlStringValue value;
     readStringExpression(value, "INSTRUCTION_CAPTURE");
-    std::string bits;
-    const std::string& text = value.text();
-    for (size_t i = 0; i < text.size(); ++i) {
-        const char c = text[i];
-        if (c == ' ' || c == '\t') continue;
-        if (c != '0' && c != '1' && c != 'X' && c != 'x')
-            m_diagnostics.error(value.lineAt(i), "INSTRUCTION_CAPTURE may hold only 0, 1 and X, found " +
-                                                     quoted(std::string_view(&text[i], 1)));
-        bits += c;
-    }
+    std::string bits = readBitPattern(value, "INSTRUCTION_CAPTURE");
     if (bits.empty()) m_diagnostics.error(line, "INSTRUCTION_CAPTURE is empty");
     m_entity->instructionCapture = std::move(bits);
 }

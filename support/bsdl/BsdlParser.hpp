@@ -70,6 +70,9 @@ private:
     void skipStatement(unsigned startLine);
     // Reads "literal { & literal } ;" (consuming the ';').
     void readStringExpression(BsdlStringValue& value, const std::string& what);
+    // The 0/1/X digits of a bit-pattern string (white space dropped); any
+    // other character is an error at its own line.
+    std::string readBitPattern(const BsdlStringValue& value, const char* attribute);
     void expectDelimiter(const char* delimiter, const std::string& context);
     std::string expectIdentifier(const std::string& context);
     void enter(unsigned& depth) const;
