@@ -21,7 +21,7 @@ this package was installed with, else from the system loader
 
 from ._library import api_version
 from .errors import JtagError
-from .records import BsdlEntity, Device, DeviceRecord
+from .records import BsdlEntity, Device, DeviceRecord, Pin
 from .session import Session
 from .svf import SvfError, SvfResult
 from .tapstate import TapState
@@ -29,5 +29,5 @@ from .target import Target
 
 __version__ = "1.0.0"
 
-__all__ = ["Session", "Target", "Device", "DeviceRecord", "BsdlEntity", "TapState", "JtagError",
+__all__ = ["Session", "Target", "Device", "DeviceRecord", "BsdlEntity", "Pin", "TapState", "JtagError",
            "SvfResult", "SvfError", "api_version", "__version__"]

@@ -109,10 +109,44 @@ class SvfResult(ctypes.Structure):
 
 assert ctypes.sizeof(SvfOptions) == 32 and ctypes.sizeof(SvfResult) == 104
 
-# Declared when the library has them (a library older than the SVF player lacks these).
+# ---- boundary scan ------------------------------------------------------------------
+BSDL_NAME_SIZE = 128
+BSDL_SHORT_SIZE = 32
+
+
+class BsdlSummary(ctypes.Structure):
+    """``JexBsdlSummary`` (184 bytes)."""
+
+    _fields_ = [("entity", ctypes.c_char * BSDL_NAME_SIZE), ("idcode", ctypes.c_char * 36),
+                ("irLength", ctypes.c_uint32), ("boundaryLength", ctypes.c_uint32),
+                ("instructionCount", ctypes.c_uint32), ("pinCount", ctypes.c_uint32),
+                ("registerAccessCount", ctypes.c_uint32)]
+
+
+class BsdlPin(ctypes.Structure):
+    """``JexBsdlPin`` (184 bytes)."""
+
+    _fields_ = [("port", ctypes.c_char * BSDL_NAME_SIZE), ("pin", ctypes.c_char * BSDL_SHORT_SIZE),
+                ("function", ctypes.c_uint32), ("cell", ctypes.c_int32), ("inputCell", ctypes.c_int32),
+                ("outputCell", ctypes.c_int32), ("controlCell", ctypes.c_int32), ("reserved", ctypes.c_uint32)]
+
+
+assert ctypes.sizeof(BsdlSummary) == 184 and ctypes.sizeof(BsdlPin) == 184
+
+_levels = ctypes.POINTER(ctypes.c_byte)  # signed char levels[]: 0, 1, -1
+
+# Declared when the library has them (a library older than the SVF player or
+# boundary scan lacks these).
 OPTIONAL_PROTOTYPES = {
     "JexJtag_svf_initOptions": [ctypes.POINTER(SvfOptions)],
     "JexJtag_svf_playFile": [_u, _s, ctypes.POINTER(SvfOptions), ctypes.POINTER(SvfResult)],
+    "JexJtag_bsdl_open": [_u, _s, _pu],
+    "JexJtag_bsdl_close": [_u, _u],
+    "JexJtag_bsdl_getSummary": [_u, _u, ctypes.POINTER(BsdlSummary)],
+    "JexJtag_bsdl_getPin": [_u, _u, _u, ctypes.POINTER(BsdlPin)],
+    "JexJtag_bsdl_sample": [_u, _u, _u, _levels, _u, ctypes.c_void_p, _u],
+    "JexJtag_bsdl_extest": [_u, _u, _u, _u, ctypes.POINTER(_s), _s, _levels, _u],
+    "JexJtag_bsdl_highz": [_u, _u, _u],
 }
 
 _lock = threading.Lock()
@@ -146,6 +180,9 @@ def _declare(lib: ctypes.CDLL) -> None:
         function = getattr(lib, name)
         function.argtypes = argtypes
         function.restype = ctypes.c_uint32
+    if hasattr(lib, "JexJtag_bsdl_functionName"):  # the one that returns a static text
+        lib.JexJtag_bsdl_functionName.argtypes = [ctypes.c_uint32]
+        lib.JexJtag_bsdl_functionName.restype = ctypes.c_char_p
 
 
 def library() -> ctypes.CDLL:

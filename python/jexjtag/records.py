@@ -1,5 +1,5 @@
 # SPDX-License-Identifier: MIT
-"""Plain records the package returns: chain devices, database entries, BSDL entities."""
+"""Plain records the package returns: chain devices, database entries, BSDL entities, pins."""
 
 from __future__ import annotations
 
@@ -49,3 +49,20 @@ class BsdlEntity(NamedTuple):
     ir_length: int
     idcode: str
     bypass: str
+
+
+class Pin(NamedTuple):
+    """One pin of a BSDL part, as ``jexjtag pins --json`` lists it.
+
+    ``port`` is the port element ("IO(0)", "CLK"); ``pin`` the package pin
+    ("9", "A4"; "" when the file maps none); ``function`` the BSDL function
+    of the pin ("bidir" for a pin with a driving and a capturing cell);
+    ``cell`` the driving cell, else the capturing one; ``level`` the level
+    read (0 or 1), ``None`` for a pin without a capturing cell.
+    """
+
+    port: str
+    pin: str
+    function: str
+    cell: int
+    level: Optional[int]

@@ -6,12 +6,12 @@ from __future__ import annotations
 import contextlib
 import ctypes
 import os
-from typing import TYPE_CHECKING, Any, Dict, Iterator, List, Optional, Union
+from typing import TYPE_CHECKING, Any, Dict, Iterator, List, Mapping, Optional, Union
 
 from . import _library as lib
-from . import svf
+from . import boundary, svf
 from .errors import JtagError
-from .records import Device
+from .records import Device, Pin
 from .tapstate import TapState
 
 if TYPE_CHECKING:
@@ -215,3 +215,32 @@ class Target:
         if self._session is None:
             raise JtagError("the target is closed", function="JexJtag_svf_playFile")
         return svf.play(self, path, keep_going, dry_run, max_frequency_hz, progress)
+
+    # ---- boundary scan ---------------------------------------------------------------
+    def sample_pins(self, device: int, bsdl: Union[str, "os.PathLike[str]"]) -> List[Pin]:
+        """SAMPLE: the pins of chain device ``device`` as its BSDL file ``bsdl`` describes them.
+
+        Every other device is put in BYPASS; the device's IR length is set
+        to the file's.  Each :class:`Pin` has the level read (``None`` for a
+        pin without a capturing cell), in the order the file declares the
+        ports.  Sampling a device that :meth:`drive_pins` or :meth:`highz`
+        left in its mode releases it.  Take the cable lock first.
+        """
+        return boundary.sample(self, device, bsdl)
+
+    def drive_pins(self, device: int, bsdl: Union[str, "os.PathLike[str]"],
+                   levels: Mapping[str, Optional[int]]) -> List[Pin]:
+        """EXTEST: drives pins of chain device ``device``; returns all its pins as read under EXTEST.
+
+        ``levels`` maps a port element ("IO(0)") or package pin ("9") to 0,
+        1 or ``None`` (released, 'z').  Every other cell holds its safe
+        value.  A pin without a driving cell, one that cannot be released,
+        or one named twice raises JtagError before anything is shifted.
+        The device stays in EXTEST (held there while other devices are
+        accessed) until :meth:`sample_pins` on it.
+        """
+        return boundary.extest(self, device, bsdl, levels)
+
+    def highz(self, device: int, bsdl: Union[str, "os.PathLike[str]"]) -> None:
+        """HIGHZ: releases every output of chain device ``device`` (held until :meth:`sample_pins` on it)."""
+        boundary.highz(self, device, bsdl)

@@ -1,6 +1,6 @@
 # SPDX-License-Identifier: MIT
 # The package end to end on the simulated cable: chain, shifts, options,
-# lock, database, BSDL, failures and messages.
+# lock, database, BSDL, pins, failures and messages.
 import logging
 import os
 
@@ -96,3 +96,25 @@ def test_play_svf(name, keep_going, outcome, checks, mismatches, line):
             assert result.message in str(raised.value) and f":{line}:" in result.message
         assert (result.outcome, result.checks, result.mismatches) == (outcome, checks, mismatches)
         assert line in (result.first_mismatch_line, result.error_line)
+
+
+def levels(pins):
+    return {pin.port: pin.level for pin in pins}
+
+
+def test_pins_of_a_simulated_bsdl_part():
+    part = os.path.join(TESTS, "e2e", "data", "board_part.bsd")
+    with jexjtag.Session() as session, session.open("jtag_sim", port=f"pins{os.getpid()}", chain=f"bsdl={part}",
+                                                    pins="0:IN1=1;0:10=1") as target, target.locked():
+        pins = target.sample_pins(0, part)
+        assert pins[0] == jexjtag.Pin("IN0", "5", "input", 0, 0)
+        assert [(p.port, p.pin, p.function) for p in pins[2:]] == [
+            ("OUT0", "7", "output3"), ("IO(0)", "9", "bidir"), ("IO(1)", "10", "bidir")]
+        assert levels(pins) == {"IN0": 0, "IN1": 1, "OUT0": None, "IO(0)": 0, "IO(1)": 1}
+        # Driven pins beat the board's levels; a released one shows the board's again.
+        driven = levels(target.drive_pins(0, part, {"IO(0)": 1, "10": 0, "OUT0": None}))
+        assert (driven["IO(0)"], driven["IO(1)"]) == (1, 0)
+        target.highz(0, part)
+        with pytest.raises(JtagError, match="JexJtag_bsdl_extest"):
+            target.drive_pins(0, part, {"IN0": 1})  # an input has no driving cell
+        assert levels(target.sample_pins(0, part))["IO(1)"] == 1
