@@ -1,6 +1,5 @@
 // SPDX-License-Identifier: MIT
-// The command line, parsed with the program's command table: options,
-// operands, values and the usage errors.
+// The program's command line, parsed with its command table: the usage errors.
 
 #include <gtest/gtest.h>
 
@@ -14,12 +13,9 @@
 
 using jexjtag::cli::ArgParser;
 using jexjtag::cli::commandTable;
-using jexjtag::cli::Options;
 using jexjtag::cli::UsageError;
 
 namespace {
-
-Options parse(std::vector<std::string> args) { return ArgParser::parse(args, commandTable()); }
 
 // The message of the usage error that parsing args raises ("" when none).
 std::string usageErrorOf(std::vector<std::string> args)
@@ -34,23 +30,11 @@ std::string usageErrorOf(std::vector<std::string> args)
 
 } // namespace
 
-TEST(ArgParserTest, ACommandsOwnOptionsKeepEveryValueInOrder)
-{
-    // Short and long names, before and after the command, "--" before an operand.
-    const Options o = parse({"-d", "1", "shift", "dr", "--device=2", "-n", "8", "--exit", "pause-dr", "--", "-0"});
-    EXPECT_EQ((std::vector<std::string>{"dr", "-0"}), o.operands);
-    EXPECT_EQ((std::vector<std::string>{"1", "2"}), o.values("device"));
-    EXPECT_EQ(2u, o.number("device").value());
-    EXPECT_EQ("pause-dr", o.value("exit").value());
-    EXPECT_FALSE(o.value("ir").has_value());
-    EXPECT_TRUE(parse({"targets", "--xml"}).flag("xml"));
-}
-
 TEST(ArgParserTest, HelpAndVersionSkipTheOperandChecks)
 {
     // 'shift --help' without operands and --version run in CliProgramTest;
     // unknown options or commands are refused also with --help.
-    EXPECT_TRUE(parse({"-h"}).help);
+    EXPECT_TRUE(ArgParser::parse({"-h"}, commandTable()).help);
     EXPECT_EQ("unknown option '--frobnicate'", usageErrorOf({"--help", "--frobnicate"}));
     EXPECT_EQ("unknown command 'frobnicate'", usageErrorOf({"frobnicate", "--help"}));
     EXPECT_EQ("unknown command 'nosuch'", usageErrorOf({"help", "nosuch"}));

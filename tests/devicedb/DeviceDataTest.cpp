@@ -147,25 +147,6 @@ TEST(DeviceDataLines, LinesAreNumberedFromZeroCountingEveryLine)
     EXPECT_EQ(lineError(1, "bad data."), errorOf("\n" + P + " 6 1 2"));
 }
 
-TEST(DeviceDataOrder, UserEntryBeforeInstallationEntryOfTheSamePattern)
-{
-    for (bool userFirst : {true, false}) {
-        Jex_DeviceData table;
-        read(table, P + " 6 1 2 INSTALLED\n", false);
-        if (userFirst) read(table, P + " 8 3 4 MINE\n", true);
-        read(table, P + " 6 1 2 INSTALLED2\n", false);
-        if (!userFirst) read(table, P + " 8 3 4 MINE\n", true);
-        ASSERT_EQ(3u, table.getEntryCount());
-        EXPECT_TRUE(table.getEntry(0).isUserEntry());
-        EXPECT_EQ("MINE", table.getDeviceName(0x0A001093));
-        EXPECT_EQ(8, table.getIRLength(0x0A001093));
-        int family = -1, sub = -1;
-        table.getFamilyTypeByIdcode(0x0A001093, &family, &sub);
-        EXPECT_EQ(3, family);
-        EXPECT_EQ(4, sub);
-    }
-}
-
 TEST(DeviceDataOrder, ConcreteBitBeforeDontCare)
 {
     Jex_DeviceData table;
@@ -177,19 +158,6 @@ TEST(DeviceDataOrder, ConcreteBitBeforeDontCare)
     EXPECT_EQ("SECOND", table.getDeviceName(0x10FFFFFF));
     EXPECT_EQ("ANY", table.getDeviceName(0x11111111));
     EXPECT_EQ("ANY", table.getEntry(2).getName());
-}
-
-TEST(DeviceDataErrors, EntriesBeforeABadLineStayAndNothingOlderIsLost)
-{
-    Jex_DeviceData table;
-    read(table, "1" + P.substr(1) + " 6 0 0 OLD\n");
-    const std::string text = "1111" + P.substr(4) + " 4 0 0 NEWB\n" + P + " 6 0 0 NEWA\n" + P + " 6 1 2 X\n";
-    EXPECT_EQ(lineError(2, "bad data."), thrown([&] { read(table, text); }));
-    ASSERT_EQ(3u, table.getEntryCount());
-    // Sorted in at once, so they take part in lookups.
-    EXPECT_EQ("NEWA", table.getEntry(0).getName());
-    EXPECT_EQ("OLD", table.getEntry(1).getName());
-    EXPECT_EQ("NEWB", table.getEntry(2).getName());
 }
 
 TEST(DeviceDataErrors, EntryConstructorRejectsWrongPatterns)

@@ -93,24 +93,6 @@ TEST(PluginXMLInfo, WrongDescriptorsAreRejectedWithAnEmptyList)
     }
 }
 
-TEST(PluginXMLInfo, ParsingIsTracedAtLevelFive)
-{
-    const std::string file = (kDescriptors / "good-three-names.xml").string();
-    {
-        LogCapture log(5);
-        Names names;
-        ASSERT_EQ(JEX_SUCCESS, JexRT::getPluginXMLInfo(file, names));
-        EXPECT_TRUE(log.has("getPluginXMLInfo - Attempting to parse " + file + "\n"));
-        EXPECT_EQ(1u, log.count("PluginXMLHandler::startElement() - Found JexPlugin!\n"));
-        EXPECT_EQ(2u, log.count("PluginXMLHandler <targetname>cable_a</targetname>\n"));
-        EXPECT_EQ(1u, log.count("PluginXMLHandler <targetname>cable_b</targetname>\n"));
-    }
-    LogCapture quieter(4);
-    Names names;
-    ASSERT_EQ(JEX_SUCCESS, JexRT::getPluginXMLInfo(file, names));
-    EXPECT_EQ(std::string::npos, quieter.text().find("PluginXMLHandler"));
-}
-
 TEST(PluginXMLInfo, UnreadableDescriptorsAreReportedAtLevelFive)
 {
     // A missing file, and a directory where the descriptor should be.

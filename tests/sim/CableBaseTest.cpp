@@ -8,9 +8,10 @@
 #include <string>
 #include <vector>
 
-#include "SimTestSupport.hpp"
 #include "jexjtag/cable/BitBuffer.hpp"
 #include "jexjtag/cable/CableBase.hpp"
+#include "jexjtag/plugin.hpp"
+#include "support/TestSupport.hpp"
 
 namespace {
 
@@ -54,7 +55,8 @@ protected:
 TEST(CableBase, ATransportFailureFailsTheOperationAndResetsTheTapNextTime)
 {
     testsupport::messages().clear();
-    const JexPluginCallbacks callbacks = simtest::hostCallbacks();
+    JexPluginCallbacks callbacks{};
+    callbacks.sendMessage = &testsupport::keepMessage;
     jexjtag::PluginHost::set(&callbacks);
     FlakyCable cable;
     ASSERT_EQ(cable.openTarget(0, nullptr, nullptr), JEX_SUCCESS);

@@ -203,16 +203,6 @@ TEST_F(TapApiTest, BypassInstructionIsOnesOfTheIRLength)
     EXPECT_TRUE(calls().empty());
 }
 
-// What autodetect sets is checked end to end (tests/e2e); here its trace.
-TEST_F(TapApiTest, AutodetectSetsIRLengthsFromTheDeviceDatabase)
-{
-    const unsigned h = openTarget({"devices=11111111:5,2345678F:9,33333333:7"});
-    const std::string list = idcodeText(0x2345678Fu) + " 6 1 0 TESTDEVICE\n";
-    ASSERT_EQ(JEX_SUCCESS, JexJtag_db_addDeviceData(h, "test.lst", list.c_str(), static_cast<unsigned>(list.size())));
-    EXPECT_EQ(JEX_SUCCESS, JexJtag_tap_autodetectChain(h, JEXJTAG_SCAN_WALKING_ONES));
-    const std::string hs = std::to_string(h);
-}
-
 TEST_F(TapApiTest, AutodetectStopsWhenInterrogationFailsAndIgnoresRefusedLengths)
 {
     const unsigned h = openTarget({"devices=11111111:5", "fail=interrogate"});
