@@ -113,6 +113,21 @@ TEST_F(E2eTargetTest, FailedOpensLeaveNoTargetAndTellTheHostWhy)
     EXPECT_EQ(3u, deviceCount());
 }
 
+// An instruction register longer than interrogation reads (65 devices of
+// 64 IR bits) is reported as that limit, not as a capture of too few bits.
+TEST_F(E2eTargetTest, AnIrBeyondTheInterrogationLimitNamesTheLimit)
+{
+    std::string chain;
+    for (int d = 0; d < 65; ++d) chain += std::string(d ? "," : "") + "none:64";
+    ASSERT_EQ(JEX_SUCCESS, open(chain));
+    EXPECT_EQ(0u, deviceCount());
+    const std::vector<std::string> warnings = messagesOfType(JEX_MSG_WARNING);
+    ASSERT_EQ(1u, warnings.size());
+    EXPECT_EQ("jtag_sim: the chain cannot be interrogated: the instruction registers are longer than 4096 bits, "
+              "the most an interrogation reads",
+              warnings[0]);
+}
+
 // A waveform that cannot be written (a full disk; /dev/full fails every
 // write) is a failing operation with a message, never a silently cut file.
 TEST_F(E2eTargetTest, AWaveformThatCannotBeWrittenFails)
