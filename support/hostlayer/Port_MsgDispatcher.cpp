@@ -37,7 +37,9 @@ Port_MsgManInit::Port_MsgManInit() { state(); }
 
 Port_MsgManInit::~Port_MsgManInit() = default;
 
-static Port_MsgManInit g_msgManInit;
+// No instance at load time: the state is built on first use.  A cable plug-in
+// that links this layer (for its BSDL reader) and never posts a message then
+// allocates nothing that its unloading would leave behind.
 
 Port_MsgMan* Port_MsgDispatcher::getDefaultMsgMan() { return state().defaultManager; }
 
