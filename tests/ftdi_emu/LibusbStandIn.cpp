@@ -109,10 +109,10 @@ void configure(World& w)
     std::set<uint8_t> rejected;
     for (const std::string& op : split(env("JEXJTAG_FTDI_EMU_REJECT"), ','))
         rejected.insert(static_cast<uint8_t>(std::strtoul(op.c_str(), nullptr, 16)));
-    for (const std::string& spec : split(env("JEXJTAG_FTDI_EMU_ADAPTERS", kDefaultAdapter), ';')) {
-        const std::vector<std::string> f = split(spec, ':');
+    for (const std::string& entry : split(env("JEXJTAG_FTDI_EMU_ADAPTERS", kDefaultAdapter), ';')) {
+        const std::vector<std::string> f = split(entry, ':');
         if (f.size() < 5) {
-            std::fprintf(stderr, "ftdi emulator: bad adapter \"%s\"\n", spec.c_str());
+            std::fprintf(stderr, "ftdi emulator: bad adapter \"%s\"\n", entry.c_str());
             continue;
         }
         auto a = std::make_unique<Adapter>();
