@@ -38,9 +38,19 @@ void checkEntry(const Jex_OneDeviceData& e)
     check(e.isMatch(static_cast<int>(e.getIdcode())));
 }
 
+// The table's order: pattern texts byte by byte with x read as X, caller's
+// entries first among equal texts.
+std::string orderKey(const Jex_OneDeviceData& e)
+{
+    std::string key = e.getMatchText();
+    for (char& c : key)
+        if (c == 'x') c = 'X';
+    return key;
+}
+
 bool inOrder(const Jex_OneDeviceData& a, const Jex_OneDeviceData& b)
 {
-    const int order = a.getMatchText().compare(b.getMatchText());
+    const int order = orderKey(a).compare(orderKey(b));
     return order < 0 || (order == 0 && (a.isUserEntry() || !b.isUserEntry()));
 }
 
